@@ -1,0 +1,52 @@
+#include <services/tracer.h>
+
+#include <stdarg.h>
+
+#include <string>
+
+namespace tzn {
+namespace tracer {
+
+int Debugger::moDebugLevel = 0;
+
+namespace {
+FILE* traceStream = nullptr;  // null: stderr
+}
+
+void Debugger::Debug(const char* message, int level, const char* module, const char* sourceFile,
+                     int line) {
+    FILE* out = traceStream ? traceStream : stderr;
+    fprintf(out, "[%s:%d] %s:%d: %s", module ? module : "", level, sourceFile ? sourceFile : "",
+            line, message ? message : "");
+    fflush(out);
+}
+
+const char* Debugger::FormatString(const char* format, ...) {
+    thread_local std::string text;
+    if (!format) {
+        text.clear();
+        return text.c_str();
+    }
+    va_list args;
+    va_start(args, format);
+    va_list measure;
+    va_copy(measure, args);
+    int length = vsnprintf(nullptr, 0, format, measure);
+    va_end(measure);
+    if (length < 0) {
+        length = 0;
+    }
+    text.assign(static_cast<size_t>(length), '\0');
+    vsnprintf(&text[0], static_cast<size_t>(length) + 1, format, args);
+    va_end(args);
+    return text.c_str();
+}
+
+FILE* Debugger::SetStream(FILE* stream) {
+    FILE* previous = traceStream ? traceStream : stderr;
+    traceStream = stream;
+    return previous;
+}
+
+}  // namespace tracer
+}  // namespace tzn
