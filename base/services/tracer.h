@@ -9,7 +9,7 @@ namespace tzn {
 namespace tracer {
 
 class DWXSERVICES_API Debugger {
-public:
+  public:
     // The process's debug level; 0 (the default) means no tracing.
     static int moDebugLevel;
 

@@ -114,13 +114,13 @@ namespace tzn {
 
 // Raised by IMPError for severity 1. what() is the message.
 class DWXSERVICES_API Exception : public std::exception {
-public:
+  public:
     Exception(int code, int severity, const char* message);
     const char* what() const noexcept override;
     int Code() const noexcept { return nCode; }
     int Severity() const noexcept { return nSeverity; }
 
-private:
+  private:
     int nCode;
     int nSeverity;
     std::string oMessage;
@@ -146,16 +146,16 @@ DWXSERVICES_API void _IMPAtExit(void (*callback)(), const char* sourceFile, int 
 // Base class of preference formats, which convert values to and from the
 // texts a PreferenceModel stores.
 class DWXSERVICES_API PreferenceFormatIF {
-protected:
+  protected:
     PreferenceFormatIF();
 
-public:
+  public:
     virtual ~PreferenceFormatIF();
 };
 
 // A host's preference store: texts under keys.
 class DWXSERVICES_API PreferenceModel {
-public:
+  public:
     virtual ~PreferenceModel();
     // Stores `text` under `key`; true on success. The model keeps its own copy.
     virtual bool StorePreference(const char* key, char* text) = 0;
