@@ -1,0 +1,206 @@
+#include <services/rtprim.h>
+
+#include <stdarg.h>
+#include <stdio.h>
+#include <stdlib.h>
+#include <string.h>
+#include <atomic>
+#include <charconv>
+
+namespace {
+
+// Callers never test for null, so running out of memory ends the process here
+// with a message instead of a crash somewhere far away.
+[[noreturn]] void OutOfMemory(size_t size) {
+    fprintf(stderr, "dwxservices: out of memory (failed to allocate %zu bytes)\n", size);
+    fflush(stderr);
+    abort();
+}
+
+// A ring of growing text buffers per thread. The ring itself is trivially
+// destructible, so MkName stays usable in exit callbacks that run after the
+// thread's destructors; RingRelease gives the buffers back when the thread ends.
+struct NameRing {
+    static constexpr int kSlots = 32;
+    char* text[kSlots];
+    size_t capacity[kSlots];
+    int next;
+};
+
+thread_local NameRing nameRing;
+
+struct RingRelease {
+    ~RingRelease() {
+        for (int i = 0; i < NameRing::kSlots; ++i) {
+            free(nameRing.text[i]);
+            nameRing.text[i] = nullptr;
+            nameRing.capacity[i] = 0;
+        }
+    }
+};
+thread_local RingRelease ringRelease;
+
+// Takes the next slot of the ring and returns its index.
+int TakeSlot() {
+    (void)&ringRelease;  // odr-use: makes sure the release runs at thread exit
+    int slot = nameRing.next;
+    nameRing.next = (slot + 1) % NameRing::kSlots;
+    return slot;
+}
+
+// The buffer of `slot`, grown to at least `size` bytes (contents not kept).
+char* Reserve(int slot, size_t size) {
+    NameRing& ring = nameRing;
+    if (ring.capacity[slot] < size) {
+        size_t capacity = ring.capacity[slot] ? ring.capacity[slot] : 64;
+        while (capacity < size) {
+            capacity *= 2;
+        }
+        free(ring.text[slot]);
+        ring.text[slot] = static_cast<char*>(HMalloc(capacity));
+        ring.capacity[slot] = capacity;
+    }
+    return ring.text[slot];
+}
+
+std::atomic<RTMessageCatalogue> messageCatalogue{nullptr};
+
+}  // namespace
+
+void* HMalloc(size_t size) {
+    void* block = malloc(size ? size : 1);
+    if (!block) {
+        OutOfMemory(size);
+    }
+    return block;
+}
+
+void* HCalloc(size_t a, size_t b) {
+    if (b && a > static_cast<size_t>(-1) / b) {
+        OutOfMemory(static_cast<size_t>(-1));
+    }
+    size_t size = a * b;
+    void* block = calloc(size ? size : 1, 1);
+    if (!block) {
+        OutOfMemory(size);
+    }
+    return block;
+}
+
+void* HRealloc(void* block, size_t size) {
+    // realloc with size 0 may free the block and return null; keep a valid block instead.
+    void* moved = realloc(block, size ? size : 1);
+    if (!moved) {
+        OutOfMemory(size);
+    }
+    return moved;
+}
+
+char* HString(const char* text) {
+    if (!text) {
+        return nullptr;
+    }
+    size_t size = strlen(text) + 1;
+    char* copy = static_cast<char*>(HMalloc(size));
+    memcpy(copy, text, size);
+    return copy;
+}
+
+char* MkName(const char* format, ...) {
+    if (!format) {
+        format = "";
+    }
+    va_list args;
+    va_start(args, format);
+    va_list retry;
+    va_copy(retry, args);
+    int slot = TakeSlot();
+    char* text = Reserve(slot, 64);
+    size_t capacity = nameRing.capacity[slot];
+    int length = vsnprintf(text, capacity, format, args);
+    va_end(args);
+    if (length < 0) {
+        text[0] = '\0';
+    } else if (static_cast<size_t>(length) >= capacity) {
+        text = Reserve(slot, static_cast<size_t>(length) + 1);
+        vsnprintf(text, static_cast<size_t>(length) + 1, format, retry);
+    }
+    va_end(retry);
+    return text;
+}
+
+char* MkName(double value, int digits) {
+    if (digits >= 0) {
+        return MkName("%.*f", digits, value);
+    }
+    // Shortest text that reads back to the same double; 32 bytes hold any of them.
+    char* text = Reserve(TakeSlot(), 32);
+    std::to_chars_result result = std::to_chars(text, text + 31, value);
+    *result.ptr = '\0';
+    return text;
+}
+
+const char* _(const char* message) {
+    if (!message) {
+        return "";
+    }
+    RTMessageCatalogue catalogue = messageCatalogue.load(std::memory_order_acquire);
+    if (catalogue) {
+        const char* translation = catalogue(message);
+        if (translation) {
+            return translation;
+        }
+    }
+    return message;
+}
+
+RTMessageCatalogue RTSetMessageCatalogue(RTMessageCatalogue catalogue) {
+    return messageCatalogue.exchange(catalogue, std::memory_order_acq_rel);
+}
+
+char* UCaseString(char* text) {
+    if (text) {
+        for (char* p = text; *p; ++p) {
+            if (*p >= 'a' && *p <= 'z') {
+                *p = static_cast<char>(*p - 'a' + 'A');
+            }
+        }
+    }
+    return text;
+}
+
+char* LCaseString(char* text) {
+    if (text) {
+        for (char* p = text; *p; ++p) {
+            if (*p >= 'A' && *p <= 'Z') {
+                *p = static_cast<char>(*p - 'A' + 'a');
+            }
+        }
+    }
+    return text;
+}
+
+double ScanDouble(const char* text, int length) {
+    if (!text || length <= 0) {
+        return 0.0;
+    }
+    // strtod reads until the number ends, which may lie past `length`; it
+    // therefore works on a terminated copy of just those characters.
+    size_t size = strnlen(text, static_cast<size_t>(length));
+    char small[128];
+    char* copy = size < sizeof small ? small : static_cast<char*>(HMalloc(size + 1));
+    memcpy(copy, text, size);
+    copy[size] = '\0';
+    double value = strtod(copy, nullptr);
+    if (copy != small) {
+        free(copy);
+    }
+    return value;
+}
+
+void TZN_qsort(void* base, size_t count, size_t size, int (*compare)(const void*, const void*)) {
+    if (!base || count < 2 || size == 0 || !compare) {
+        return;
+    }
+    qsort(base, count, size, compare);
+}
