@@ -1,7 +1,165 @@
 #include <dwxcore/dwxobject.h>
 
+#include <unordered_set>
+#include <vector>
+
+namespace {
+
+// The members met by a walk of `container`, in walk order.
+std::vector<DWXObject*> Snapshot(const DWXContainer* container) {
+    std::vector<DWXObject*> members;
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(container); member; member = iter.Next()) {
+        members.push_back(member);
+    }
+    return members;
+}
+
+}  // namespace
+
+// DWXObject
+
 DWXObject::~DWXObject() {}
 
 void DWXObject::Dump(FILE* stream) const {
+    if (!stream) {
+        return;
+    }
     fprintf(stream, "%s:%p\n", GetClassName(), (const void*)this);
 }
+
+// DWXContainer
+
+DWXContainer::~DWXContainer() {}
+
+void DWXContainer::Dump(FILE* stream) const {
+    if (!stream) {
+        return;
+    }
+    fprintf(stream, "%s:\n", GetClassName());
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(this); member; member = iter.Next()) {
+        member->Dump(stream);
+    }
+}
+
+void DWXContainer::DestroyIterator(DWXIter*) const {}
+
+void DWXContainer::Empty() {
+    // Restart after every removal so that the walk never steps from a member
+    // that is gone. A Remove that refuses what Start yields would loop for
+    // ever, so stop there.
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(this); member; member = iter.Start(this)) {
+        if (!Remove(member)) {
+            break;
+        }
+    }
+}
+
+int DWXContainer::Validate() const {
+    int result = 1;
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(this); member; member = iter.Next()) {
+        const DWXValidatable* validatable = dynamic_cast<const DWXValidatable*>(member);
+        if (validatable && result == 1 && !validatable->Validate()) {
+            result = 0;
+        }
+    }
+    return result;
+}
+
+void DWXContainer::AddContainer(const DWXContainer* other) {
+    if (!other) {
+        return;
+    }
+    if (other == this) {
+        // Walking ourselves while adding would meet the new members and
+        // never end.
+        for (DWXObject* member : Snapshot(this)) {
+            Add(member);
+        }
+        return;
+    }
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(other); member; member = iter.Next()) {
+        Add(member);
+    }
+}
+
+void DWXContainer::DestroyContents() {
+    // A pointer may be stored more than once; delete it only the first time.
+    std::unordered_set<DWXObject*> deleted;
+    for (DWXObject* member : Snapshot(this)) {
+        if (deleted.insert(member).second) {
+            delete member;
+        }
+    }
+    Empty();
+}
+
+int64_t DWXContainer::GetPosition(const DWXIter* iter) {
+    return iter->nPosition;
+}
+
+void DWXContainer::SetPosition(DWXIter* iter, int64_t position) {
+    iter->nPosition = position;
+}
+
+// DWXIter
+
+DWXIter::DWXIter() : poTarget(nullptr), poCurrent(nullptr), nPosition(0) {}
+
+DWXIter::DWXIter(const DWXContainer* container)
+    : poTarget(container), poCurrent(nullptr), nPosition(0) {
+    if (poTarget) {
+        poCurrent = poTarget->Start(this);
+    }
+}
+
+DWXIter::DWXIter(const DWXIter& other)
+    : DWXObject(other),
+      poTarget(other.poTarget),
+      poCurrent(other.poCurrent),
+      nPosition(other.nPosition) {}
+
+DWXIter& DWXIter::operator=(const DWXIter& other) {
+    poTarget = other.poTarget;
+    poCurrent = other.poCurrent;
+    nPosition = other.nPosition;
+    return *this;
+}
+
+DWXIter::~DWXIter() {}
+
+const char* DWXIter::GetClassName() const {
+    return "DWXIter";
+}
+
+DWXObject* DWXIter::Start(const DWXContainer* container) {
+    if (container) {
+        poTarget = container;
+        poCurrent = nullptr;
+    }
+    poCurrent = poTarget ? poTarget->Start(this) : nullptr;
+    return poCurrent;
+}
+
+DWXObject* DWXIter::Next() {
+    poCurrent = poTarget ? poTarget->Next(this) : nullptr;
+    return poCurrent;
+}
+
+DWXIter& DWXIter::operator++() {
+    Next();
+    return *this;
+}
+
+void DWXIter::SetTarget(const DWXContainer* container) {
+    poTarget = container;
+    poCurrent = nullptr;
+}
+
+// DWXValidatable
+
+DWXValidatable::~DWXValidatable() {}

@@ -1,0 +1,105 @@
+#include <dwxcore/dwxobject.h>
+
+#include <services/rtprim.h>
+
+#include <stdlib.h>
+#include <climits>
+
+DWXBag::DWXBag() : nCapacity(0), ppoItems(nullptr) {}
+
+DWXBag::DWXBag(const DWXContainer* container) : DWXBag() {
+    if (!container) {
+        return;
+    }
+    if (container->GetCount() > 0) {
+        nCapacity = container->GetCount();
+        ppoItems = static_cast<DWXObject**>(HMalloc(nCapacity * sizeof(DWXObject*)));
+    }
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(container); member; member = iter.Next()) {
+        Add(member);
+    }
+}
+
+DWXBag::DWXBag(const DWXBag& other) : DWXBag(static_cast<const DWXContainer*>(&other)) {}
+
+DWXBag& DWXBag::operator=(const DWXBag& other) {
+    if (&other == this) {
+        return *this;
+    }
+    Empty();
+    if (other.nCount > 0) {
+        nCapacity = other.nCount;
+        ppoItems = static_cast<DWXObject**>(HMalloc(nCapacity * sizeof(DWXObject*)));
+    }
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(&other); member; member = iter.Next()) {
+        Add(member);
+    }
+    return *this;
+}
+
+DWXBag::~DWXBag() {
+    free(ppoItems);
+}
+
+const char* DWXBag::GetClassName() const {
+    return "DWXBag";
+}
+
+// The walk keeps the index of the next slot. Members added during a walk are
+// visited; removing the member just yielded makes the walk miss the last
+// member, which moved into the slot behind it.
+DWXObject* DWXBag::Start(DWXIter* iter) const {
+    SetPosition(iter, 1);
+    return nCount > 0 ? ppoItems[0] : nullptr;
+}
+
+DWXObject* DWXBag::Next(DWXIter* iter) const {
+    int64_t position = GetPosition(iter);
+    if (position < 0 || position >= nCount) {
+        return nullptr;
+    }
+    SetPosition(iter, position + 1);
+    return ppoItems[position];
+}
+
+int DWXBag::IsMember(const DWXObject* object) {
+    for (int i = 0; i < nCount; ++i) {
+        if (ppoItems[i] == object) {
+            return 1;
+        }
+    }
+    return 0;
+}
+
+void DWXBag::Add(DWXObject* object) {
+    if (nCount == nCapacity) {
+        // Grows by about 1.3: 0, 5, 11, 19, 29, 42, ...
+        double wanted = nCapacity * 1.3 + 5.0;
+        if (nCapacity == INT_MAX) {
+            return;  // the count cannot go higher
+        }
+        int capacity = wanted > INT_MAX ? INT_MAX : static_cast<int>(wanted);
+        ppoItems = static_cast<DWXObject**>(HRealloc(ppoItems, capacity * sizeof(DWXObject*)));
+        nCapacity = capacity;
+    }
+    ppoItems[nCount++] = object;
+}
+
+int DWXBag::Remove(const DWXObject* object) {
+    for (int i = 0; i < nCount; ++i) {
+        if (ppoItems[i] == object) {
+            ppoItems[i] = ppoItems[nCount - 1];
+            --nCount;
+            return 1;
+        }
+    }
+    return 0;
+}
+
+void DWXBag::Empty() {
+    free(ppoItems);
+    ppoItems = nullptr;
+    nCount = nCapacity = 0;
+}
