@@ -5,6 +5,7 @@
 
 #include <stdio.h>
 #include <stdlib.h>
+#include <unistd.h>
 
 #include <memory>
 #include <string>
@@ -86,4 +87,46 @@ TEST(PreferenceModelTest, ColoursAreWrittenAsTheirPreferenceText) {
               "  (FillColor String \"4,5,6\")\n"
               "  (LineColor String \"1,2,3\")\n"
               ")\n");
+}
+
+TEST(PreferenceModelTest, ColoursAndTextsComeBackFromAWrittenFile) {
+    const char* texts[] = {"",   "two words",    "q\"uote", "line\nfeed", "back\\slash",
+                           "x)", "@menu Cancel", "a,b|c"};
+    char path[] = "/tmp/prefmodel_testXXXXXX";
+    const int fd = mkstemp(path);
+    ASSERT_GE(fd, 0);
+    close(fd);
+    {
+        PTNSubTree tree("prefs");
+        PTNPreferenceModel model(&tree);
+        DWXColorPreferenceFormat format(&model);
+        ASSERT_TRUE(StoreColor(format, "FillColor", DWXColor(0, 255, 128, 0)));
+        ASSERT_TRUE(StoreColor(format, "LineColor", DWXColor(1, 2, 3)));
+        for (int i = 0; i < 8; ++i) {
+            ASSERT_TRUE(Store(model, ("Text" + std::to_string(i)).c_str(), texts[i]));
+        }
+        FILE* out = fopen(path, "w");
+        ASSERT_NE(out, nullptr);
+        tree.WriteToFile(out);
+        fclose(out);
+    }
+
+    PTNSubTree root("root");
+    FILE* in = DKOpen(path, 4, "r");
+    ASSERT_NE(in, nullptr);
+    root.BuildFromFile(in);
+    DKClose(in);
+    remove(path);
+    auto* prefs = static_cast<PTNSubTree*>(root.GetChild("prefs", "PTNSubTree"));
+    ASSERT_NE(prefs, nullptr);
+    PTNPreferenceModel model(prefs);
+    DWXColorPreferenceFormat format(&model);
+    std::unique_ptr<DWXColor> fill(format.GetPreference(nullptr, "FillColor"));
+    std::unique_ptr<DWXColor> line(format.GetPreference(nullptr, "LineColor"));
+    ASSERT_TRUE(fill && line);
+    EXPECT_EQ(*fill, DWXColor(255, 128, 0));
+    EXPECT_EQ(*line, DWXColor(1, 2, 3));
+    for (int i = 0; i < 8; ++i) {
+        EXPECT_STREQ(model.LookupPreference(("text" + std::to_string(i)).c_str()), texts[i]);
+    }
 }
