@@ -54,7 +54,8 @@ DWXSERVICES_API int DKCheck(const char* path);
 // Opens `path` with fopen mode `how` and remembers the path for fp2filename;
 // null when it cannot be opened. `mode` is kept for compatibility (4 = read).
 DWXSERVICES_API FILE* DKOpen(const char* path, int mode, const char* how);
-// Closes a stream and forgets its path; a null stream is ignored.
+// Closes a stream and forgets its path; returns fclose's result. A null
+// stream is ignored (0).
 DWXSERVICES_API int DKClose(FILE* stream);
 // The next line of the stream without its line end; null at the end. Borrowed:
 // valid until the next DKReadLine call of the same thread.
@@ -73,7 +74,8 @@ DWXSERVICES_API const char* fp2filename(FILE* stream);
 DWXSERVICES_API char* IMPFindFile(const char* key, const char* name);
 // A heap copy of `text` with $NAME and ${NAME} replaced by the environment
 // variable's value; an unset variable gives an empty text, and a '$' not
-// followed by a name stays as it is. Caller frees with free().
+// followed by a name (or "${" without its "}") stays as it is. Null gives
+// null. Caller frees with free().
 DWXSERVICES_API char* HStringExpand(const char* text);
 
 // ---------------------------------------------------------------------------
@@ -130,14 +132,16 @@ class DWXSERVICES_API Exception : public std::exception {
 
 typedef void (*IMPErrorHandler)(int code, int severity, const char* message);
 // Installs the handler every IMPError report goes to; null restores the
-// default, which writes one line to stderr. Returns the previous handler.
+// default, which writes one line to stderr. Returns the previous handler (the
+// default one when none was installed), so a handler may pass reports on.
 DWXSERVICES_API IMPErrorHandler IMPSetErrorHandler(IMPErrorHandler handler);
 // Reports to the installed handler. Severity 1 then throws tzn::Exception;
 // every other severity returns.
 DWXSERVICES_API void IMPError(int code, int severity, const char* message);
 
-// Runs `callback` once at process exit; the last registered runs first.
-// `sourceFile` and `line` name the registering place for diagnostics.
+// Runs `callback` once at process exit; the last registered runs first. A
+// callback may register further callbacks; they run too. `sourceFile` and
+// `line` name the registering place in diagnostics.
 DWXSERVICES_API void _IMPAtExit(void (*callback)(), const char* sourceFile, int line);
 
 // ---------------------------------------------------------------------------

@@ -1,0 +1,313 @@
+// String lists: building, copying, tokenizing and converting to and from text.
+#include <services/utilhub.h>
+
+#include "utilhub_internal.h"
+
+#include <stdint.h>
+#include <stdlib.h>
+#include <string.h>
+#include <sys/stat.h>
+
+#if defined(_WIN32)
+#include <malloc.h>
+#elif defined(__APPLE__)
+#include <malloc/malloc.h>
+#else
+#include <malloc.h>
+#endif
+
+using utilhub_internal::IsWhite;
+
+namespace {
+
+// Bytes usable in a block from malloc; 0 where the platform cannot tell.
+size_t UsableSize(void* block) {
+#if defined(_WIN32)
+    return _msize(block);
+#elif defined(__APPLE__)
+    return malloc_size(block);
+#elif defined(__GLIBC__)
+    return malloc_usable_size(block);
+#else
+    (void)block;
+    return 0;
+#endif
+}
+
+// Appending one entry must not rescan the list, yet callers keep only the
+// bare array. A list made here therefore has a power-of-two number of slots
+// (at least count + 2), and its last slot holds a tag that encodes the count
+// together with the array's address. The tag is checked against the
+// terminator before it is trusted; lists made elsewhere simply have no valid
+// tag and are counted once.
+uintptr_t AddressKey(char* const* list) {
+    uint64_t key = static_cast<uint64_t>(reinterpret_cast<uintptr_t>(list));
+    key = (key ^ (key >> 29)) * 0xBF58476D1CE4E5B9ull;
+    return static_cast<uintptr_t>(key ^ 0xA5C3F00DD15EA5E5ull);
+}
+
+// Largest power of two not above `n` (0 for 0).
+size_t FloorPowerOfTwo(size_t n) {
+    size_t power = 1;
+    while (power <= n / 2) {
+        power *= 2;
+    }
+    return n ? power : 0;
+}
+
+// Builds a string list in place; the entries pushed become the list's.
+class ListBuilder {
+  public:
+    ListBuilder() = default;
+
+    // Continues an existing list (null starts a new one).
+    explicit ListBuilder(char** list) : items(list) {
+        if (!list) {
+            return;
+        }
+        size_t slots = FloorPowerOfTwo(UsableSize(list) / sizeof(char*));
+        if (slots >= kMinimumSlots) {
+            size_t tagged = reinterpret_cast<uintptr_t>(list[slots - 1]) ^ AddressKey(list);
+            if (tagged <= slots - 2 && !list[tagged] && (tagged == 0 || list[tagged - 1])) {
+                count = tagged;
+                capacity = slots;
+                return;
+            }
+        }
+        while (list[count]) {
+            ++count;
+        }
+        capacity = count + 1;  // only the slots known to exist
+    }
+
+    ListBuilder(const ListBuilder&) = delete;
+    ListBuilder& operator=(const ListBuilder&) = delete;
+
+    size_t Count() const { return count; }
+    char* At(size_t index) const { return items[index]; }
+
+    void Push(char* entry) {
+        if (count + 3 > capacity) {
+            Grow();
+        }
+        items[count++] = entry;
+    }
+
+    void PushCopy(const char* begin, size_t length) {
+        char* entry = static_cast<char*>(HMalloc(length + 1));
+        memcpy(entry, begin, length);
+        entry[length] = '\0';
+        Push(entry);
+    }
+
+    // Terminates and tags the list and hands it over.
+    char** Finish() {
+        if (count + 2 > capacity) {
+            Grow();
+        }
+        items[count] = nullptr;
+        items[capacity - 1] = reinterpret_cast<char*>(count ^ AddressKey(items));
+        return items;
+    }
+
+  private:
+    static constexpr size_t kMinimumSlots = 4;
+
+    void Grow() {
+        size_t slots = kMinimumSlots;
+        while (slots < count + 3) {
+            slots *= 2;
+        }
+        items = static_cast<char**>(HRealloc(items, slots * sizeof(char*)));
+        capacity = slots;
+    }
+
+    char** items = nullptr;
+    size_t count = 0;
+    size_t capacity = 0;
+};
+
+// One entry per line of `length` bytes at `text`: LF ends a line, a CR
+// before it (or at the very end) is dropped, a leading UTF-8 BOM is skipped.
+char** SplitLines(const char* text, size_t length) {
+    ListBuilder lines;
+    const char* end = text + length;
+    if (length >= 3 && memcmp(text, "\xEF\xBB\xBF", 3) == 0) {
+        text += 3;
+    }
+    while (text < end) {
+        const char* lineEnd =
+            static_cast<const char*>(memchr(text, '\n', static_cast<size_t>(end - text)));
+        const char* next = lineEnd ? lineEnd + 1 : end;
+        if (!lineEnd) {
+            lineEnd = end;
+        }
+        size_t lineLength = static_cast<size_t>(lineEnd - text);
+        if (lineLength && text[lineLength - 1] == '\r') {
+            --lineLength;
+        }
+        lines.PushCopy(text, lineLength);
+        text = next;
+    }
+    return lines.Finish();
+}
+
+}  // namespace
+
+char** Tokenize(const char* text) {
+    ListBuilder tokens;
+    const unsigned char* p = reinterpret_cast<const unsigned char*>(text ? text : "");
+    for (;;) {
+        while (IsWhite(*p)) {
+            ++p;
+        }
+        if (!*p) {
+            break;
+        }
+        const unsigned char* start = p;
+        bool quoted = false;
+        for (; *p && (quoted || !IsWhite(*p)); ++p) {
+            if (*p == '"') {
+                quoted = !quoted;
+            }
+        }
+        tokens.PushCopy(reinterpret_cast<const char*>(start), static_cast<size_t>(p - start));
+    }
+    return tokens.Finish();
+}
+
+char** TokenizeDelim(const char* text, const char* delimiters) {
+    bool isDelimiter[256] = {};
+    for (const unsigned char* d =
+             reinterpret_cast<const unsigned char*>(delimiters ? delimiters : "");
+         *d; ++d) {
+        isDelimiter[*d] = true;
+    }
+    ListBuilder pieces;
+    const unsigned char* p = reinterpret_cast<const unsigned char*>(text ? text : "");
+    while (*p) {
+        const unsigned char* start = p;
+        while (*p && !isDelimiter[*p]) {
+            ++p;
+        }
+        if (p > start) {
+            pieces.PushCopy(reinterpret_cast<const char*>(start), static_cast<size_t>(p - start));
+        }
+        if (*p) {
+            ++p;
+        }
+    }
+    return pieces.Finish();
+}
+
+int CountStringList(char* const* list) {
+    int count = 0;
+    if (list) {
+        while (list[count]) {
+            ++count;
+        }
+    }
+    return count;
+}
+
+void DestroyStringList(char** list) {
+    if (!list) {
+        return;
+    }
+    for (char** entry = list; *entry; ++entry) {
+        free(*entry);
+    }
+    free(list);
+}
+
+char** DuplicateStringList(char* const* list) {
+    if (!list) {
+        return nullptr;
+    }
+    ListBuilder copy;
+    for (; *list; ++list) {
+        copy.Push(HString(*list));
+    }
+    return copy.Finish();
+}
+
+char** AddStringToList(char** list, const char* text) {
+    ListBuilder builder(list);
+    builder.Push(HString(text ? text : ""));
+    return builder.Finish();
+}
+
+char** AddStringList(char** list, char* const* other) {
+    ListBuilder builder(list);
+    if (other && other == list) {
+        // Appending a list to itself: copy the entries that were there before.
+        size_t count = builder.Count();
+        for (size_t i = 0; i < count; ++i) {
+            builder.Push(HString(builder.At(i)));
+        }
+    } else if (other) {
+        for (; *other; ++other) {
+            builder.Push(HString(*other));
+        }
+    }
+    return builder.Finish();
+}
+
+char** BufferToStringList(const char* buffer) {
+    if (!buffer) {
+        return nullptr;
+    }
+    return SplitLines(buffer, strlen(buffer));
+}
+
+char** TextFileToStringList(const char* path) {
+    if (!path) {
+        return nullptr;
+    }
+    struct stat info;
+    if (stat(path, &info) != 0 || !S_ISREG(info.st_mode)) {
+        return nullptr;
+    }
+    FILE* file = fopen(path, "rb");
+    if (!file) {
+        return nullptr;
+    }
+    // One read of the expected size; the loop only continues when the file
+    // grew meanwhile (or reports size 0 while holding text, as some do).
+    size_t capacity = static_cast<size_t>(info.st_size) + 1;
+    size_t length = 0;
+    char* content = static_cast<char*>(HMalloc(capacity));
+    for (;;) {
+        length += fread(content + length, 1, capacity - length, file);
+        if (length < capacity || ferror(file)) {
+            break;
+        }
+        capacity *= 2;
+        content = static_cast<char*>(HRealloc(content, capacity));
+    }
+    bool failed = ferror(file) != 0;
+    fclose(file);
+    char** lines = failed ? nullptr : SplitLines(content, length);
+    free(content);
+    return lines;
+}
+
+char* StringListToBuffer(char* const* list) {
+    size_t total = 1;
+    int count = CountStringList(list);
+    size_t* lengths = static_cast<size_t*>(HMalloc(static_cast<size_t>(count) * sizeof(size_t)));
+    for (int i = 0; i < count; ++i) {
+        lengths[i] = strlen(list[i]);
+        total += lengths[i] + 1;
+    }
+    char* buffer = static_cast<char*>(HMalloc(total));
+    char* out = buffer;
+    for (int i = 0; i < count; ++i) {
+        memcpy(out, list[i], lengths[i]);
+        out += lengths[i];
+        *out++ = '\n';
+    }
+    *out = '\0';
+    free(lengths);
+    return buffer;
+}
