@@ -213,6 +213,30 @@ def base64(tmp):
         expect("decode " + name, ["base64", "-decode", name], tmp, 1, out="", err=message)
 
 
+def edges(tmp):
+    write(tmp, {
+        "empty.cfg": "# nothing but a comment\n\n",
+        "leaf.cfg": "(n Integer 7)\n(t SubTree\n  (a Integer 1)\n  (A String \"second\")\n)\n",
+        "base.cfg": "(t SubTree\n  (a Integer 1)\n  (s SubTree\n    (a Integer 2)\n  )\n)\n",
+        "other.cfg": "(t SubTree\n  (a Integer 5)\n  (s Integer 9)\n  (new Integer 3)\n)\n",
+    })
+    expect("empty file", ["check", "empty.cfg"], tmp, 0,
+           out="empty.cfg: ok, 0 nodes, 0 subtrees, depth 0, 1 files read\n")
+    expect("empty json", ["json", "empty.cfg"], tmp, 0, out="{}\n")
+    # Nodes outside every subtree are written one per line and read back.
+    expect("top-level leaf", ["show", "leaf.cfg"], tmp, 0,
+           out='(n Integer 7)\n(t SubTree\n  (a Integer 1)\n  (A String "second")\n)\n')
+    expect("first of a name", ["get", "leaf.cfg", "T/a"], tmp, 0, out="1\n")
+    expect("validate leaf first", ["check", "leaf.cfg", "-name", "n"], tmp, 1, err="named 'n'")
+    # Merging in place: a leaf of OTHER does not replace a subtree of BASE,
+    # and names BASE lacks are not added.
+    expect("merge in place", ["merge", "base.cfg", "other.cfg", "-o", "base.cfg"], tmp, 0, out="")
+    expect("merged in place", ["show", "base.cfg"], tmp, 0,
+           out="(t SubTree\n  (a Integer 5)\n  (s SubTree\n    (a Integer 2)\n  )\n)\n")
+    expect("merge unwritable", ["merge", "base.cfg", "other.cfg", "-o", "no/such/dir/x.cfg"],
+           tmp, 1, err=r"cannot write 'no/such/dir/x\.cfg'")
+
+
 def usage(tmp):
     for args, err in [
         ([], r"usage: dwxtree SUBCOMMAND"),
@@ -242,7 +266,7 @@ def usage(tmp):
 
 
 def main():
-    for group in (examples, broken, includes, json_escapes, base64, usage):
+    for group in (examples, broken, includes, json_escapes, base64, edges, usage):
         with tempfile.TemporaryDirectory() as tmp:
             group(tmp)
     for failure in failures:
