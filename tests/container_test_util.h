@@ -45,6 +45,7 @@ template <typename Array>
 class SlotView : public Array {
   public:
     using Array::Array;
+    using Array::operator=;
     int Capacity() const { return this->nCapacity; }
     int Top() const { return this->nTop; }
     bool HasBuffer() const { return this->ppoItems != nullptr; }
