@@ -92,12 +92,18 @@ TEST_F(BagTest, WalksSurviveChanges) {
     EXPECT_EQ(iter.Next(), &d);
     EXPECT_EQ(iter.Next(), nullptr);
 
+    bag.Add(&a);  // c, b, d, a
     DWXIter second(&bag);
-    bag.Remove(&d);  // not yet reached: d is last, nothing moves
-    bag.Remove(&b);  // not yet reached: the last member moves forward
-    EXPECT_EQ(Walk(bag), (Members{&c}));
+    bag.Remove(&b);  // not yet reached: a moves forward and is still visited
+    EXPECT_EQ(second.Next(), &a);
+    EXPECT_EQ(second.Next(), &d);
     bag.Empty();
     EXPECT_EQ(second.Next(), nullptr);
+
+    DWXIter third(&bag);  // started on an empty bag: sees what is added later
+    bag.Add(&a);
+    bag.Add(&b);
+    EXPECT_EQ(third.Next(), &a);
 }
 
 TEST_F(BagTest, CopiesShareMembersNotBuffers) {
