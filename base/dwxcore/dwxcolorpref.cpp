@@ -6,7 +6,6 @@
 #include <services/utilhub.h>
 
 #include <stdlib.h>
-#include <string.h>
 
 #include <string>
 

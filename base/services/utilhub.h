@@ -2,7 +2,9 @@
 // reporting, exit hooks and the preference-format base classes.
 //
 // A string list is a null-terminated array of heap C strings; the array and
-// every entry come from malloc, and DestroyStringList releases both.
+// every entry come from malloc, and DestroyStringList releases both. The
+// array may have spare slots after its terminator, so that appending one
+// entry takes amortised constant time.
 #pragma once
 
 #include <services/rtprim.h>
