@@ -12,6 +12,7 @@
 #include <string.h>
 
 #include <string>
+#include <utility>
 #include <vector>
 
 #if DWXBENCH_HAVE_OPENSSL
@@ -42,68 +43,92 @@ const std::vector<unsigned char>& Data() {
     return data;
 }
 
+bool SameAsData(const std::string& bytes) {
+    return bytes.size() == Data().size() && memcmp(bytes.data(), Data().data(), bytes.size()) == 0;
+}
+
 const std::string& Text() {
     static const std::string text =
         base64_encode(Data().data(), static_cast<unsigned int>(Data().size()));
     return text;
 }
 
+// Each contender's last output is checked once after the timing loop, so
+// that every figure belongs to a correct result.
+void Check(benchmark::State& state, const std::string& result, bool encoded) {
+    if (encoded ? result != Text() : !SameAsData(result)) {
+        state.SkipWithError("wrong result");
+    }
+}
+
 void EncodeOurs(benchmark::State& state) {
     const auto& data = Data();
+    std::string result;
     for (auto _ : state) {
-        std::string text = base64_encode(data.data(), static_cast<unsigned int>(data.size()));
-        benchmark::DoNotOptimize(text.data());
+        result = base64_encode(data.data(), static_cast<unsigned int>(data.size()));
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, true);
 }
 
 void DecodeOurs(benchmark::State& state) {
     const std::string& text = Text();
+    std::string result;
     for (auto _ : state) {
-        std::string bytes = base64_decode(text);
-        benchmark::DoNotOptimize(bytes.data());
+        result = base64_decode(text);
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, false);
 }
 
 // The reference: the bytes copied into a new buffer.
 void CopyMemcpy(benchmark::State& state) {
     const auto& data = Data();
+    std::string result;
     for (auto _ : state) {
-        std::string copy(reinterpret_cast<const char*>(data.data()), data.size());
-        benchmark::DoNotOptimize(copy.data());
+        result = std::string(reinterpret_cast<const char*>(data.data()), data.size());
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, false);
 }
 
 #if DWXBENCH_HAVE_OPENSSL
 void EncodeOpenSsl(benchmark::State& state) {
     const auto& data = Data();
+    std::string result;
     for (auto _ : state) {
         // EVP_EncodeBlock writes a terminating NUL after the text.
         std::string text(4 * ((data.size() + 2) / 3) + 1, '\0');
         int length = EVP_EncodeBlock(reinterpret_cast<unsigned char*>(&text[0]), data.data(),
                                      static_cast<int>(data.size()));
         text.resize(static_cast<size_t>(length));
-        benchmark::DoNotOptimize(text.data());
+        result = std::move(text);
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, true);
 }
 
 void DecodeOpenSsl(benchmark::State& state) {
     const std::string& text = Text();
+    // EVP_DecodeBlock counts the bytes that the pad characters stand for.
+    const size_t pad = (text.size() >= 1 && text[text.size() - 1] == '=') +
+                       (text.size() >= 2 && text[text.size() - 2] == '=');
+    std::string result;
     for (auto _ : state) {
         std::string bytes(text.size() / 4 * 3, '\0');
         int length = EVP_DecodeBlock(reinterpret_cast<unsigned char*>(&bytes[0]),
                                      reinterpret_cast<const unsigned char*>(text.data()),
                                      static_cast<int>(text.size()));
-        // The count includes the bytes that the pad characters stand for.
-        size_t pad =
-            text.size() >= 2 ? (text[text.size() - 1] == '=') + (text[text.size() - 2] == '=') : 0;
-        bytes.resize(static_cast<size_t>(length) - pad);
-        benchmark::DoNotOptimize(bytes.data());
+        bytes.resize(length > 0 ? static_cast<size_t>(length) - pad : 0);
+        result = std::move(bytes);
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, false);
 }
 #endif
 
@@ -111,22 +136,27 @@ void DecodeOpenSsl(benchmark::State& state) {
 void EncodeAbseil(benchmark::State& state) {
     const auto& data = Data();
     const absl::string_view view(reinterpret_cast<const char*>(data.data()), data.size());
+    std::string result;
     for (auto _ : state) {
-        std::string text = absl::Base64Escape(view);
-        benchmark::DoNotOptimize(text.data());
+        result = absl::Base64Escape(view);
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, true);
 }
 
 void DecodeAbseil(benchmark::State& state) {
     const std::string& text = Text();
+    std::string result;
     for (auto _ : state) {
         std::string bytes;
         bool ok = absl::Base64Unescape(text, &bytes);
         benchmark::DoNotOptimize(ok);
-        benchmark::DoNotOptimize(bytes.data());
+        result = std::move(bytes);
+        benchmark::DoNotOptimize(result.data());
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * kBytes));
+    Check(state, result, false);
 }
 #endif
 
