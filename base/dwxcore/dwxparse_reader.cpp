@@ -1,12 +1,14 @@
 // Reading the text form of a parse tree into a PTNSubTree.
 //
 // Every line is visited once: empty and comment lines are skipped (but
-// counted), every other line is copied into a reusable buffer, trimmed, cut
-// and split in place, and the node it describes is appended at once, so that
-// everything read before a failure stays in the tree. Nested subtrees are read
-// with an explicit stack of open subtrees rather than by recursion, so the
-// depth of nesting is bounded by memory, not by the call stack; includes
-// recurse, bounded by the include depth limit.
+// counted), every other line is trimmed, cut and split in place, and the node
+// it describes is appended at once, so that everything read before a failure
+// stays in the tree. Files and buffers are walked line by line through one
+// reused buffer (TextLineReader); string lists are copied a line at a time
+// into a scratch buffer, since their lines are the caller's. Nested subtrees
+// are read with an explicit stack of open subtrees rather than by recursion,
+// so the depth of nesting is bounded by memory, not by the call stack;
+// includes recurse, bounded by the include depth limit.
 #include <dwxcore/dwxparse.h>
 
 #include "dwxparse_token.h"
@@ -30,11 +32,6 @@ namespace {
 
 // Nested includes allowed below the file the reading started from.
 constexpr int kMaxIncludeDepth = 64;
-
-struct StringListDeleter {
-    void operator()(char** list) const { DestroyStringList(list); }
-};
-using StringListPtr = std::unique_ptr<char*, StringListDeleter>;
 
 struct FreeDeleter {
     void operator()(char* text) const { free(text); }
@@ -175,9 +172,8 @@ class ChainEntry {
     throw tzn::Exception(-1, 1, message.c_str());
 }
 
-// The whole content of a stream from its start, as lines; the stream is left
-// at its start.
-char** ReadStreamLines(FILE* stream) {
+// The whole content of a stream from its start; the stream is left at its start.
+std::string ReadStream(FILE* stream) {
     rewind(stream);
     std::string content;
     char chunk[65536];
@@ -186,50 +182,72 @@ char** ReadStreamLines(FILE* stream) {
         content.append(chunk, got);
     }
     rewind(stream);
-    return BufferToStringList(content.c_str());
+    return content;
 }
+
+// The lines of a string list, each copied into a scratch buffer before it is
+// cut, since the list stays the caller's; the position is where reading stopped.
+class ListLines {
+  public:
+    explicit ListLines(char** lines) : ppcPosition(lines) {}
+    char* Next(size_t* length) {
+        const char* line = *ppcPosition;
+        if (!line) {
+            return nullptr;
+        }
+        ++ppcPosition;
+        oScratch.assign(line);
+        *length = oScratch.size();
+        return &oScratch[0];
+    }
+    char** Position() const { return ppcPosition; }
+
+  private:
+    char** ppcPosition;
+    std::string oScratch;
+};
 
 // Reads lines into a subtree. One reader serves a whole call, includes
 // included, so that its scratch buffers are allocated once.
 class TreeReader {
   public:
-    // Reads from `lines` into `root` until a closing line at the outermost
-    // level or the end of the list. `count` is the line counter, updated on
-    // return. Returns the position after the closing line, the terminator's
-    // position, or null for a null list and for a reading that an error inside
-    // a nested subtree ended; an error at the outermost level propagates.
-    char** Read(PTNSubTree* root, char** lines, const char* fileName, int& count);
+    // Reads from `lines` (a ListLines or a TextLineReader) into `root` until
+    // a closing line at the outermost level or the end of the lines. `count`
+    // is the line counter, updated on return. Returns false when an error
+    // inside a nested subtree ended the reading; an error at the outermost
+    // level propagates.
+    template <typename Lines>
+    bool Read(PTNSubTree* root, Lines& lines, const char* fileName, int& count);
 
   private:
-    // Copies a line, trims it, cuts a glued ')' and splits it in place.
-    // Returns the number of tokens; oTokens holds them, null-terminated.
-    size_t Split(const char* line);
+    // Trims the line of `length` bytes at `line`, cuts a glued ')' and splits
+    // it in place, from `first`, its first non-white character. Returns the
+    // number of tokens; oTokens holds them, null-terminated.
+    size_t Split(char* line, size_t length, char* first);
     void BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount);
     void Include(PTNSubTree* target, const char* directive, const char* file, int line,
                  const char* fileName, bool required);
 
-    std::string oLine;
     std::vector<char*> oTokens;
     std::string oJoined;
     std::vector<double> oDoubles;
 };
 
-size_t TreeReader::Split(const char* line) {
-    oLine.assign(line);
-    size_t length = oLine.size();
-    while (length > 0 && IsWhite(static_cast<unsigned char>(oLine[length - 1]))) {
-        --length;
+size_t TreeReader::Split(char* line, size_t length, char* first) {
+    char* end = line + length;
+    while (end > first && IsWhite(static_cast<unsigned char>(end[-1]))) {
+        --end;
     }
     // A final ')' glued to the last token closes the node line and is no
     // token; one that follows a blank stays a token of its own. Only the
     // blank counts here, a tab before ')' does not.
-    if (length > 1 && oLine[length - 1] == ')' && oLine[length - 2] != ' ') {
-        --length;
+    if (end - line > 1 && end[-1] == ')' && end[-2] != ' ') {
+        --end;
     }
-    oLine.resize(length);
+    *end = '\0';
 
     oTokens.clear();
-    char* p = &oLine[0];
+    char* p = first;
     for (;;) {
         while (IsWhite(static_cast<unsigned char>(*p))) {
             ++p;
@@ -255,24 +273,26 @@ size_t TreeReader::Split(const char* line) {
     return count;
 }
 
-char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, int& count) {
-    if (!lines) {
-        return nullptr;
-    }
+template <typename Lines>
+bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int& count) {
     // The subtrees opened and not yet closed, each with the count at its
     // opening line: an error inside one ends the reading with that count, as
     // the level that holds it would have kept.
     std::vector<std::pair<PTNSubTree*, int>> open;
     int counter = count;
-    char** position = lines;
-    while (*position) {
+    size_t length;
+    while (char* line = lines.Next(&length)) {
         ++counter;
-        const char* text = *position++;
-        if (PTNSubTree::IsCommentOrEmptyLine(text)) {
+        // Empty and comment lines, as IsCommentOrEmptyLine decides.
+        char* first = line;
+        while (IsWhite(static_cast<unsigned char>(*first))) {
+            ++first;
+        }
+        if (*first == '\0' || *first == '!' || *first == '#') {
             continue;
         }
         try {
-            size_t tokenCount = Split(text);
+            size_t tokenCount = Split(line, length, first);
             if (tokenCount > 0 && oTokens[0][0] == ')') {
                 if (open.empty()) {
                     break;
@@ -306,11 +326,11 @@ char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, in
                 throw;
             }
             count = open.back().second;
-            return nullptr;
+            return false;
         }
     }
     count = counter;
-    return position;
+    return true;
 }
 
 void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount) {
@@ -421,11 +441,14 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
         if (stream) {
             rewind(stream.get());
             const char* openedName = fp2filename(stream.get());
-            StringListPtr lines(TextFileToStringList(openedName ? openedName : path.get()));
-            if (lines) {
+            if (!openedName) {
+                openedName = path.get();
+            }
+            TextLineReader lines;
+            if (lines.OpenFile(openedName)) {
                 ChainEntry entry(std::move(canonical), true);
                 int counter = 0;
-                Read(target, lines.get(), openedName ? openedName : path.get(), counter);
+                Read(target, lines, openedName, counter);
                 return;
             }
         }
@@ -446,11 +469,13 @@ void PTNSubTree::BuildFromFile(FILE* stream) {
     }
     rewind(stream);
     const char* name = fp2filename(stream);
-    StringListPtr lines(name ? TextFileToStringList(name) : nullptr);
-    if (!lines) {
+    TextLineReader lines;
+    std::string content;
+    if (!name || !lines.OpenFile(name)) {
         // A stream that DKOpen did not open (or whose file went away) is
         // read from its own content.
-        lines.reset(ReadStreamLines(stream));
+        content = ReadStream(stream);
+        lines.OpenBuffer(content.c_str());
     }
     std::unique_ptr<ChainEntry> entry;
     if (name) {
@@ -458,27 +483,32 @@ void PTNSubTree::BuildFromFile(FILE* stream) {
     }
     TreeReader reader;
     int counter = 0;
-    reader.Read(this, lines.get(), name, counter);
+    reader.Read(this, lines, name, counter);
 }
 
 void PTNSubTree::BuildFromString(const char* buffer) {
     if (!buffer) {
         return;
     }
-    StringListPtr lines(BufferToStringList(buffer));
+    TextLineReader lines;
+    lines.OpenBuffer(buffer);
     TreeReader reader;
     int counter = 0;
-    reader.Read(this, lines.get(), nullptr, counter);
+    reader.Read(this, lines, nullptr, counter);
 }
 
 char** PTNSubTree::AddChildrenFromStringList(char** lines, const char* fileName, int* lineCounter) {
+    if (!lines) {
+        return nullptr;
+    }
+    ListLines source(lines);
     TreeReader reader;
     int counter = lineCounter ? *lineCounter : 0;
-    char** position = reader.Read(this, lines, fileName, counter);
+    bool finished = reader.Read(this, source, fileName, counter);
     if (lineCounter) {
         *lineCounter = counter;
     }
-    return position;
+    return finished ? source.Position() : nullptr;
 }
 
 int PTNSubTree::IsCommentOrEmptyLine(const char* line) {

@@ -48,6 +48,51 @@ DWXSERVICES_API char** TextFileToStringList(const char* path);
 // The entries joined into one heap buffer, each followed by LF. Caller frees with free().
 DWXSERVICES_API char* StringListToBuffer(char* const* list);
 
+// The lines of a text file or buffer, one at a time, split by the rules of
+// TextFileToStringList and BufferToStringList but without a heap copy of each
+// line: a file is read in blocks into one buffer that the reader owns and
+// reuses, so memory stays small whatever the file's size.
+class DWXSERVICES_API TextLineReader {
+  public:
+    TextLineReader();
+    ~TextLineReader();
+    TextLineReader(const TextLineReader&) = delete;
+    TextLineReader& operator=(const TextLineReader&) = delete;
+
+    // Starts on the file at `path`. 0, and no lines, when it is not a regular
+    // file that can be opened for reading. The file stays open until the
+    // reader is destroyed or opened again.
+    int OpenFile(const char* path);
+    // Starts on a NUL-terminated buffer (null has no lines). The buffer is not
+    // copied: it must stay unchanged while the reader walks it.
+    void OpenBuffer(const char* buffer);
+    // The next line without its line end, NUL-terminated, and its length in
+    // `length` (may be null); null after the last line. A line ends at its
+    // first NUL byte. The text is the reader's: the caller may change it, its
+    // terminator included, and it is valid until the next call.
+    char* Next(size_t* length);
+    // Non-zero when reading the file failed; the lines handed out before that
+    // are the ones before the failure.
+    int Failed() const { return bFailed ? 1 : 0; }
+
+  private:
+    void Close();
+    bool Fill();
+    void Reserve(size_t size);
+
+    FILE* poFile;
+    char* pcBuffer;  // nCapacity bytes and room for a terminator
+    size_t nCapacity;
+    size_t nBegin;       // first byte of the next line
+    size_t nScanned;     // bytes before this hold no line end after nBegin
+    size_t nFilled;      // bytes read into the buffer
+    const char* pcText;  // a walked buffer: its next line and its end
+    const char* pcTextEnd;
+    bool bEnd;
+    bool bFailed;
+    bool bNul;  // a NUL byte was read: lines are cut at their first one
+};
+
 // ---------------------------------------------------------------------------
 // Files and paths
 

@@ -6,7 +6,6 @@
 #include <stdint.h>
 #include <stdlib.h>
 #include <string.h>
-#include <sys/stat.h>
 
 #if defined(_WIN32)
 #include <malloc.h>
@@ -17,6 +16,8 @@
 #endif
 
 using utilhub_internal::IsWhite;
+using utilhub_internal::LineAt;
+using utilhub_internal::StartsWithBom;
 
 namespace {
 
@@ -127,25 +128,17 @@ class ListBuilder {
     size_t capacity = 0;
 };
 
-// One entry per line of `length` bytes at `text`: LF ends a line, a CR
-// before it (or at the very end) is dropped, a leading UTF-8 BOM is skipped.
+// One entry per line of `length` bytes at `text` (rules of LineAt); a
+// leading UTF-8 byte order mark is skipped.
 char** SplitLines(const char* text, size_t length) {
     ListBuilder lines;
     const char* end = text + length;
-    if (length >= 3 && memcmp(text, "\xEF\xBB\xBF", 3) == 0) {
+    if (StartsWithBom(text, length)) {
         text += 3;
     }
     while (text < end) {
-        const char* lineEnd =
-            static_cast<const char*>(memchr(text, '\n', static_cast<size_t>(end - text)));
-        const char* next = lineEnd ? lineEnd + 1 : end;
-        if (!lineEnd) {
-            lineEnd = end;
-        }
-        size_t lineLength = static_cast<size_t>(lineEnd - text);
-        if (lineLength && text[lineLength - 1] == '\r') {
-            --lineLength;
-        }
+        size_t lineLength;
+        const char* next = LineAt(text, end, &lineLength);
         lines.PushCopy(text, lineLength);
         text = next;
     }
@@ -261,35 +254,21 @@ char** BufferToStringList(const char* buffer) {
 }
 
 char** TextFileToStringList(const char* path) {
-    if (!path) {
+    TextLineReader reader;
+    if (!reader.OpenFile(path)) {
         return nullptr;
     }
-    struct stat info;
-    if (stat(path, &info) != 0 || !S_ISREG(info.st_mode)) {
+    ListBuilder lines;
+    size_t length;
+    while (const char* line = reader.Next(&length)) {
+        lines.PushCopy(line, length);
+    }
+    char** list = lines.Finish();
+    if (reader.Failed()) {
+        DestroyStringList(list);
         return nullptr;
     }
-    FILE* file = fopen(path, "rb");
-    if (!file) {
-        return nullptr;
-    }
-    // One read of the expected size; the loop only continues when the file
-    // grew meanwhile (or reports size 0 while holding text, as some do).
-    size_t capacity = static_cast<size_t>(info.st_size) + 1;
-    size_t length = 0;
-    char* content = static_cast<char*>(HMalloc(capacity));
-    for (;;) {
-        length += fread(content + length, 1, capacity - length, file);
-        if (length < capacity || ferror(file)) {
-            break;
-        }
-        capacity *= 2;
-        content = static_cast<char*>(HRealloc(content, capacity));
-    }
-    bool failed = ferror(file) != 0;
-    fclose(file);
-    char** lines = failed ? nullptr : SplitLines(content, length);
-    free(content);
-    return lines;
+    return list;
 }
 
 char* StringListToBuffer(char* const* list) {
