@@ -11,6 +11,7 @@
 // includes recurse, bounded by the include depth limit.
 #include <dwxcore/dwxparse.h>
 
+#include "dwxparse_scan.h"
 #include "dwxparse_token.h"
 
 #include <services/rtprim.h>
@@ -43,18 +44,19 @@ struct StreamCloser {
 };
 using StreamPtr = std::unique_ptr<FILE, StreamCloser>;
 
-// The white space that separates tokens and that trailing trimming removes;
-// the same set as Tokenize splits at.
-inline bool IsWhite(unsigned char c) {
-    return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f';
-}
+using dwxparse_scan::BeginsWith;
+using dwxparse_scan::ClassOf;
+using dwxparse_scan::IsWhite;
+using dwxparse_scan::MakeKeyword;
+using dwxparse_scan::Matches;
+using dwxparse_scan::ScanDouble;
+using dwxparse_scan::ScanInteger;
 
 const char* SourceName(const char* fileName) {
     return fileName ? fileName : "Memory";
 }
 
-// The type keywords the reader builds nodes for, compared ignoring case; a
-// keyword that begins with "Bool" is a Bool whatever follows.
+// The type keywords the reader builds nodes for.
 enum class Keyword {
     SubTree,
     String,
@@ -68,36 +70,50 @@ enum class Keyword {
     Other
 };
 
-// Every line passes here, so the first letter picks the few candidates
-// before any whole comparison is made.
-Keyword Classify(const char* keyword) {
+constexpr dwxparse_scan::KeywordPattern kSubTree = MakeKeyword("subtree");
+constexpr dwxparse_scan::KeywordPattern kString = MakeKeyword("string");
+constexpr dwxparse_scan::KeywordPattern kStringList = MakeKeyword("stringlist");
+constexpr dwxparse_scan::KeywordPattern kInteger = MakeKeyword("integer");
+constexpr dwxparse_scan::KeywordPattern kChar = MakeKeyword("char");
+constexpr dwxparse_scan::KeywordPattern kBool = MakeKeyword("bool");
+constexpr dwxparse_scan::KeywordPattern kBase64 = MakeKeyword("base64");
+constexpr dwxparse_scan::KeywordPattern kDouble = MakeKeyword("double");
+constexpr dwxparse_scan::KeywordPattern kDoubleList = MakeKeyword("doublelist");
+constexpr dwxparse_scan::KeywordPattern kTrue = MakeKeyword("true");
+constexpr dwxparse_scan::KeywordPattern kYes = MakeKeyword("yes");
+constexpr dwxparse_scan::KeywordPattern kOne = MakeKeyword("1");
+constexpr dwxparse_scan::KeywordPattern kY = MakeKeyword("y");
+
+// The keyword of `length` bytes, compared ignoring ASCII case; a keyword
+// that begins with "Bool" is a Bool whatever follows.
+Keyword Classify(const char* keyword, size_t length) {
     switch (keyword[0] | 0x20) {
         case 's':
-            if (_stricmp(keyword, "SubTree") == 0)
+            if (Matches(keyword, length, kSubTree))
                 return Keyword::SubTree;
-            if (_stricmp(keyword, "String") == 0)
+            if (Matches(keyword, length, kString))
                 return Keyword::String;
-            if (_stricmp(keyword, "StringList") == 0)
+            if (Matches(keyword, length, kStringList))
                 return Keyword::StringList;
             break;
         case 'i':
-            if (_stricmp(keyword, "Integer") == 0)
+            if (Matches(keyword, length, kInteger))
                 return Keyword::Integer;
             break;
         case 'c':
-            if (_stricmp(keyword, "Char") == 0)
+            if (Matches(keyword, length, kChar))
                 return Keyword::Char;
             break;
         case 'b':
-            if (_strnicmp(keyword, "Bool", 4) == 0)
+            if (BeginsWith(keyword, length, kBool))
                 return Keyword::Bool;
-            if (_stricmp(keyword, "Base64") == 0)
+            if (Matches(keyword, length, kBase64))
                 return Keyword::Base64;
             break;
         case 'd':
-            if (_stricmp(keyword, "Double") == 0)
+            if (Matches(keyword, length, kDouble))
                 return Keyword::Double;
-            if (_stricmp(keyword, "DoubleList") == 0)
+            if (Matches(keyword, length, kDoubleList))
                 return Keyword::DoubleList;
             break;
         default:
@@ -228,14 +244,15 @@ class TreeReader {
     void Include(PTNSubTree* target, const char* directive, const char* file, int line,
                  const char* fileName, bool required);
 
-    std::vector<char*> oTokens;
+    std::vector<char*> oTokens;  // the tokens of the current line, null-terminated
+    std::vector<size_t> oLengths;
     std::string oJoined;
     std::vector<double> oDoubles;
 };
 
 size_t TreeReader::Split(char* line, size_t length, char* first) {
     char* end = line + length;
-    while (end > first && IsWhite(static_cast<unsigned char>(end[-1]))) {
+    while (end > first && IsWhite(end[-1])) {
         --end;
     }
     // A final ')' glued to the last token closes the node line and is no
@@ -246,30 +263,47 @@ size_t TreeReader::Split(char* line, size_t length, char* first) {
     }
     *end = '\0';
 
-    oTokens.clear();
+    // Tokens are runs of bytes up to white space or the end; a quoted run
+    // goes on to its closing quote (or the end) whatever it holds.
+    if (oTokens.empty()) {
+        oTokens.resize(8);
+        oLengths.resize(8);
+    }
+    size_t count = 0;
     char* p = first;
-    for (;;) {
-        while (IsWhite(static_cast<unsigned char>(*p))) {
-            ++p;
+    while (*p != '\0') {
+        if (count + 2 > oTokens.size()) {
+            oTokens.resize(2 * count + 8);
+            oLengths.resize(oTokens.size());
         }
-        if (*p == '\0') {
-            break;
-        }
-        oTokens.push_back(p);
-        bool quoted = false;
-        while (*p != '\0' && (quoted || !IsWhite(static_cast<unsigned char>(*p)))) {
-            if (*p == '"') {
-                quoted = !quoted;
+        char* start = p;
+        for (;;) {
+            unsigned char kind = ClassOf(*p);
+            if (kind == dwxparse_scan::kPlain) {
+                ++p;
+            } else if (kind == dwxparse_scan::kQuote) {
+                do {
+                    ++p;
+                } while (*p != '"' && *p != '\0');
+                if (*p == '"') {
+                    ++p;
+                }
+            } else {
+                break;
             }
-            ++p;
         }
+        oTokens[count] = start;
+        oLengths[count] = static_cast<size_t>(p - start);
+        ++count;
         if (*p == '\0') {
             break;
         }
         *p++ = '\0';
+        while (IsWhite(*p)) {
+            ++p;
+        }
     }
-    size_t count = oTokens.size();
-    oTokens.push_back(nullptr);
+    oTokens[count] = nullptr;
     return count;
 }
 
@@ -285,7 +319,7 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
         ++counter;
         // Empty and comment lines, as IsCommentOrEmptyLine decides.
         char* first = line;
-        while (IsWhite(static_cast<unsigned char>(*first))) {
+        while (IsWhite(*first)) {
             ++first;
         }
         if (*first == '\0' || *first == '!' || *first == '#') {
@@ -309,7 +343,7 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
             Keyword kind = Keyword::Other;
             if (IsDirective(name, required)) {
                 Include(current, name, oTokens[1], counter, fileName, required);
-            } else if ((kind = Classify(oTokens[1])) == Keyword::SubTree) {
+            } else if ((kind = Classify(oTokens[1], oLengths[1])) == Keyword::SubTree) {
                 auto subtree = std::make_unique<PTNSubTree>(name);
                 PTNSubTree* raw = subtree.get();
                 current->AddChild(subtree.release());
@@ -366,24 +400,25 @@ void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, s
             break;
         }
         case Keyword::Integer:
-            node = std::make_unique<PTNInteger>(name, atoi(third));
+            node = std::make_unique<PTNInteger>(name, ScanInteger(third));
             break;
         case Keyword::Char:
             node = std::make_unique<PTNChar>(name, third[0]);
             break;
         case Keyword::Bool: {
-            int value = _stricmp(third, "TRUE") == 0 || _stricmp(third, "YES") == 0 ||
-                        _stricmp(third, "1") == 0 || _stricmp(third, "Y") == 0;
+            size_t length = oLengths[2];
+            int value = Matches(third, length, kTrue) || Matches(third, length, kYes) ||
+                        Matches(third, length, kOne) || Matches(third, length, kY);
             node = std::make_unique<PTNBool>(name, value);
             break;
         }
         case Keyword::Double:
-            node = std::make_unique<PTNDouble>(name, atof(third));
+            node = std::make_unique<PTNDouble>(name, ScanDouble(third));
             break;
         case Keyword::DoubleList:
             oDoubles.clear();
             for (size_t i = 2; i < valueEnd; ++i) {
-                oDoubles.push_back(atof(oTokens[i]));
+                oDoubles.push_back(ScanDouble(oTokens[i]));
             }
             // No value tokens give a list without values (and without an array).
             node = std::make_unique<PTNDoubleList>(name, static_cast<int>(oDoubles.size()),
