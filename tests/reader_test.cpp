@@ -7,10 +7,13 @@
 
 #include <gtest/gtest.h>
 
+#include <stdio.h>
 #include <stdlib.h>
+#include <string.h>
 
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -124,6 +127,25 @@ TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
         {"(x Integer32List 1)", nullptr, nullptr},
         {"(x Float 1.5)", nullptr, nullptr},
         {"(x Whatever 1)", nullptr, nullptr},
+        // Keywords ignore ASCII case only; near misses build nothing.
+        {"(x iNtEgEr 7)", "PTNInteger", "7"},
+        {"(x CHAR z)", "PTNChar", "z"},
+        {"(x BASE64 YWI)", "PTNBase64", "YWI"},
+        {"(x stringLIST a)", "PTNStringList", "\"a\""},
+        {"(x DOUBLELIST 1)", "PTNDoubleList", "1"},
+        {"(x Integr 1)", nullptr, nullptr},
+        {"(x Integer2 1)", nullptr, nullptr},
+        {"(x Strin 1)", nullptr, nullptr},
+        {"(x Base6 YWI)", nullptr, nullptr},
+        {"(x Base\x16\x14 YWI)", nullptr, nullptr},
+        {"(x DoubleLists 1)", nullptr, nullptr},
+        {"(x Bo 1)", nullptr, nullptr},
+        {"(x Bool\xC0 t)", "PTNBool", "FALSE"},
+        {"(b Bool True)", "PTNBool", "TRUE"},
+        {"(b Bool YES)", "PTNBool", "TRUE"},
+        {"(b Bool yess)", "PTNBool", "FALSE"},
+        {"(b Bool 11)", "PTNBool", "FALSE"},
+        {"(b Bool \x11)", "PTNBool", "FALSE"},
     };
     for (const Row& row : rows) {
         SCOPED_TRACE(row.line);
@@ -147,6 +169,57 @@ TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
     EXPECT_EQ(tree->GetChildAsBool("b"), 1);
     ASSERT_NE(tree->GetChildAsStringList("l"), nullptr);
     EXPECT_EQ(tree->GetChildAsStringList("l")[0], nullptr);
+}
+
+// Integer and Double values are atoi and atof of their token, bit for bit,
+// whatever shortcut the reader takes for plain numbers.
+TEST_F(ReaderTest, NumbersReadAsTheCRuntimeReadsThem) {
+    const char* integers[] = {"0",          "-0",          "+7",         "123456789",
+                              "-987654321", "1234567890",  "2147483647", "-2147483648",
+                              "2147483648", "99999999999", "12abc",      "0x10",
+                              "-",          "+",           "007"};
+    for (const char* token : integers) {
+        auto tree = Read(("(n Integer " + std::string(token) + ")").c_str());
+        EXPECT_EQ(tree->GetChildAsInteger("n"), atoi(token)) << token;
+    }
+    const char* doubles[] = {"0",
+                             "-0",
+                             "-0.0",
+                             "1.5",
+                             ".5",
+                             "5.",
+                             "-.25",
+                             "+3.75",
+                             "0.1",
+                             "3.14159265358979",
+                             "999999999999999",
+                             "1234567890123456",
+                             "0.30000000000000004",
+                             "1e3",
+                             "1.5E-3",
+                             "0x1p3",
+                             "inf",
+                             "-nan",
+                             "1.5x",
+                             "1..5",
+                             ".",
+                             "-"};
+    for (const char* token : doubles) {
+        auto tree = Read(
+            ("(d Double " + std::string(token) + ")\n(l DoubleList " + std::string(token) + ")")
+                .c_str());
+        double expected = atof(token);
+        auto* value = dynamic_cast<PTNDouble*>(tree->GetChild("d"));
+        ASSERT_NE(value, nullptr) << token;
+        double got = value->GetValue();
+        EXPECT_EQ(memcmp(&got, &expected, sizeof got), 0) << token << " " << got;
+        auto* list = dynamic_cast<PTNDoubleList*>(tree->GetChild("l"));
+        ASSERT_NE(list, nullptr) << token;
+        int count = 0;
+        double* values = list->GetValue(&count);
+        ASSERT_EQ(count, 1) << token;
+        EXPECT_EQ(memcmp(&values[0], &expected, sizeof expected), 0) << token;
+    }
 }
 
 TEST_F(ReaderTest, CorruptLineOutsideSubtreesReachesHost) {
@@ -264,6 +337,92 @@ TEST_F(ReaderTest, FilesAndForeignStreams) {
     EXPECT_EQ(ftell(foreign), 0);
     fclose(foreign);
     other.BuildFromFile(nullptr);  // ignored
+}
+
+// Every node with its class and value, subtrees as name{...}.
+std::string Render(const PTNSubTree* tree) {
+    std::string text;
+    DWXIter it(tree->GetChildren());
+    for (DWXObject* object = it.Current(); object; object = it.Next()) {
+        auto* node = static_cast<DWXParseTreeNode*>(object);
+        text += std::string(node->GetName()) + ":" + node->GetClassName();
+        if (auto* sub = dynamic_cast<PTNSubTree*>(node)) {
+            text += "{" + Render(sub) + "}";
+        } else {
+            text += "=" + ValueText(node);
+        }
+        text += ' ';
+    }
+    return text;
+}
+
+// Everything a read leaves: the tree, the reports and the exception.
+std::string Outcome(PTNSubTree& tree, const std::function<void()>& read) {
+    gReports.clear();
+    std::string outcome;
+    try {
+        read();
+    } catch (const tzn::Exception& e) {
+        outcome = std::string("exception: ") + e.what() + "\n";
+    }
+    for (const Report& report : gReports) {
+        outcome += std::to_string(report.code) + "/" + std::to_string(report.severity) + ": " +
+                   report.message + "\n";
+    }
+    outcome += Render(&tree);
+    return outcome;
+}
+
+// A file is read line by line in place, not as a string list; every outcome
+// must be the one of reading its string list.
+TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
+    std::string longValue(300000, 'v');
+    std::string many;
+    for (int i = 0; many.size() < 400000; ++i) {
+        many += "  (n" + std::to_string(i) + (i % 2 ? " Integer " : " String \"") +
+                std::to_string(i) + (i % 2 ? ")\n" : "\")\r\n");
+    }
+    const std::string texts[] = {
+        "(a Integer 1)\r\n(b String \"x y\")\r\n\r\n(c Integer 3)\r",
+        "\xEF\xBB\xBF(a Integer 1)\n(b Integer 2)",
+        "(a Integer 1)\n\xEF\xBB\xBF(b Integer 2)\n",
+        std::string("(a String \"x\0y\")\n(b Integer 2)\n(c\0 Integer 3)\n", 45),
+        "(s SubTree\n  (a Integer 1)\n\t)\n(b Integer 2)\n",
+        "",
+        "\n\n",
+        "(a Integer 1\n)\n(never Integer 2)\n",
+        "(s SubTree\n(t SubTree\n(a Double 2.5)",
+        "(v String \"" + longValue + "\")\n(w Integer 1)\n",
+        "(s SubTree\n" + many + ")\n",
+    };
+    int index = 0;
+    for (const std::string& text : texts) {
+        SCOPED_TRACE(index);
+        std::string path = Write("case" + std::to_string(index++) + ".cfg", text);
+        PTNSubTree inPlace("root");
+        std::string got = Outcome(inPlace, [&] { ReadFile(inPlace, path); });
+        PTNSubTree fromList("root");
+        std::string expected = Outcome(fromList, [&] {
+            char** lines = TextFileToStringList(path.c_str());
+            struct Release {
+                char** list;
+                ~Release() { DestroyStringList(list); }
+            } release{lines};
+            int counter = 0;
+            fromList.AddChildrenFromStringList(lines, path.c_str(), &counter);
+        });
+        EXPECT_EQ(got, expected);
+        if (text.find('\0') == std::string::npos) {
+            PTNSubTree fromBuffer("root");
+            std::string buffered =
+                Outcome(fromBuffer, [&] { fromBuffer.BuildFromString(text.c_str()); });
+            std::string memory = expected;
+            for (size_t at; (at = memory.find(path)) != std::string::npos;) {
+                memory.replace(at, path.size(), "Memory");
+            }
+            EXPECT_EQ(buffered, memory);
+        }
+    }
 }
 
 TEST_F(ReaderTest, IncludesPlaceNodesAndCountOwnLines) {

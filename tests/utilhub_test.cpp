@@ -29,6 +29,22 @@ Lines Consume(char** list) {
     return lines;
 }
 
+// Every line a TextLineReader hands out after `open`.
+template <typename Open>
+Lines ReadLines(TextLineReader& reader, Open open) {
+    Lines lines;
+    open(reader);
+    size_t length = 0;
+    while (char* line = reader.Next(&length)) {
+        EXPECT_EQ(strlen(line), length);
+        lines.push_back(line);
+        line[0] = '\0';  // the text is the caller's to change
+    }
+    EXPECT_EQ(reader.Next(&length), nullptr);  // and stays at the end
+    EXPECT_EQ(reader.Failed(), 0);
+    return lines;
+}
+
 // A scratch directory, removed with its content at the end of the test.
 class TempDir {
   public:
@@ -147,13 +163,45 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
         {"\xEF\xBB\xBFhead\n", {"head"}},
         {"a\n\xEF\xBB\xBF", {"a", "\xEF\xBB\xBF"}},
         {std::string(100000, 'L') + "\nshort", {std::string(100000, 'L'), "short"}},
+        {std::string(300000, 'L') + "\r", {std::string(300000, 'L')}},
+        // A file line ends at its first NUL byte, as its list entry reads.
+        {std::string("a\0b\nc\0\r\nd", 9), {"a", "c", "d"}},
     };
     TempDir dir;
+    TextLineReader reader;  // reused across files and buffers
     for (const Case& c : cases) {
-        EXPECT_EQ(Consume(BufferToStringList(c.text.c_str())), c.lines) << c.text;
         std::string path = dir.Write("lines.txt", c.text);
         EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), c.lines) << c.text;
+        EXPECT_EQ(
+            ReadLines(reader, [&](TextLineReader& r) { EXPECT_EQ(r.OpenFile(path.c_str()), 1); }),
+            c.lines)
+            << c.text;
+        if (c.text.find('\0') != std::string::npos) {
+            continue;  // a buffer ends at its first NUL
+        }
+        EXPECT_EQ(Consume(BufferToStringList(c.text.c_str())), c.lines) << c.text;
+        EXPECT_EQ(ReadLines(reader, [&](TextLineReader& r) { r.OpenBuffer(c.text.c_str()); }),
+                  c.lines)
+            << c.text;
     }
+    // Lines of every length around the reader's block boundaries come out whole.
+    std::string text;
+    Lines expected;
+    for (int i = 0; text.size() < 700000; ++i) {
+        expected.push_back(
+            std::string(static_cast<size_t>(i % 4099), static_cast<char>('a' + i % 26)));
+        text += expected.back() + (i % 3 ? "\n" : "\r\n");
+    }
+    std::string big = dir.Write("big.txt", text);
+    EXPECT_EQ(ReadLines(reader, [&](TextLineReader& r) { r.OpenFile(big.c_str()); }), expected);
+    EXPECT_EQ(Consume(TextFileToStringList(big.c_str())), expected);
+    // A new reader's first line may be empty.
+    TextLineReader fresh;
+    EXPECT_EQ(ReadLines(fresh, [](TextLineReader& r) { r.OpenBuffer("\n"); }), Lines{""});
+    // Nothing to read: no lines, until opened on something else.
+    EXPECT_EQ(ReadLines(reader, [](TextLineReader& r) { r.OpenBuffer(nullptr); }), Lines{});
+    EXPECT_EQ(ReadLines(reader, [](TextLineReader& r) { EXPECT_EQ(r.OpenFile(nullptr), 0); }),
+              Lines{});
     EXPECT_EQ(BufferToStringList(nullptr), nullptr);
     EXPECT_EQ(TextFileToStringList(nullptr), nullptr);
     EXPECT_EQ(TextFileToStringList((dir.path + "/missing").c_str()), nullptr);
@@ -178,6 +226,9 @@ TEST(UtilhubFiles, OnlyReadableRegularFilesPassTheCheck) {
                                     fifo, dir.path + "/missing", std::string()}) {
         EXPECT_EQ(DKCheck(path.c_str()), 0) << path;
         EXPECT_EQ(TextFileToStringList(path.c_str()), nullptr) << path;
+        TextLineReader reader;
+        EXPECT_EQ(reader.OpenFile(path.c_str()), 0) << path;
+        EXPECT_EQ(reader.Next(nullptr), nullptr) << path;
     }
     EXPECT_EQ(DKCheck(nullptr), 0);
     if (geteuid() != 0) {  // root reads anything

@@ -56,17 +56,35 @@ constexpr KeywordPattern MakeKeyword(const char* lower) {
     return keyword;
 }
 
+template <typename Word>
+inline bool WordMatches(const char* text, const KeywordPattern& keyword, size_t offset) {
+    Word word, lower, fold;
+    memcpy(&word, text + offset, sizeof word);
+    memcpy(&lower, keyword.lower + offset, sizeof lower);
+    memcpy(&fold, keyword.fold + offset, sizeof fold);
+    return (word | fold) == lower;
+}
+
 // Whether the first keyword.length bytes of `text` (which has at least as
-// many) are the keyword ignoring ASCII case: two words at a time rather than
-// a byte at a time, since every line's keyword passes here.
+// many) are the keyword ignoring ASCII case. Every line's keyword passes
+// here, so a keyword of 4 to 16 bytes is compared as two words that may
+// overlap: its first and its last.
 inline bool MatchesAt(const char* text, const KeywordPattern& keyword) {
-    unsigned char bytes[16] = {};
-    memcpy(bytes, text, keyword.length);
-    uint64_t word[2], lower[2], fold[2];
-    memcpy(word, bytes, sizeof word);
-    memcpy(lower, keyword.lower, sizeof lower);
-    memcpy(fold, keyword.fold, sizeof fold);
-    return ((word[0] | fold[0]) == lower[0]) & ((word[1] | fold[1]) == lower[1]);
+    size_t length = keyword.length;
+    if (length >= 8) {
+        return WordMatches<uint64_t>(text, keyword, 0) &
+               WordMatches<uint64_t>(text, keyword, length - 8);
+    }
+    if (length >= 4) {
+        return WordMatches<uint32_t>(text, keyword, 0) &
+               WordMatches<uint32_t>(text, keyword, length - 4);
+    }
+    for (size_t i = 0; i < length; ++i) {
+        if ((static_cast<unsigned char>(text[i]) | keyword.fold[i]) != keyword.lower[i]) {
+            return false;
+        }
+    }
+    return true;
 }
 
 // Whether the `length` bytes at `text` are the keyword whole, ignoring ASCII case.

@@ -48,7 +48,7 @@ void TextLineReader::Close() {
 }
 
 void TextLineReader::Reserve(size_t size) {
-    if (size <= nCapacity) {
+    if (pcBuffer && size <= nCapacity) {
         return;
     }
     size_t capacity = nCapacity ? nCapacity : kBlockSize;
