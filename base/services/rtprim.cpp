@@ -100,8 +100,13 @@ char* HString(const char* text) {
     if (!text) {
         return nullptr;
     }
+    // Every stored name and value is one of these: malloc directly, without
+    // the call through HMalloc.
     size_t size = strlen(text) + 1;
-    char* copy = static_cast<char*>(HMalloc(size));
+    char* copy = static_cast<char*>(malloc(size));
+    if (!copy) {
+        OutOfMemory(size);
+    }
     memcpy(copy, text, size);
     return copy;
 }
