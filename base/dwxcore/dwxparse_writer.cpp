@@ -101,22 +101,42 @@ class TextOut {
     size_t nCapacity;
 };
 
-// The library's own leaf classes, which the writer renders itself; any other
-// class, a host's subclass included, renders through its GetAsString.
-enum class LeafKind { kOther, kBool, kChar, kInteger, kFloat, kDouble, kString };
+// The library's own node classes. The writer nests plain subtrees and
+// renders the scalar leaves itself; the other leaves, and every other class,
+// a host's subclass included, render through their GetAsString.
+enum class NodeKind {
+    kOther,
+    kSubTree,
+    kOtherLeaf,  // a library leaf without a rendering of the writer's own
+    kBool,
+    kChar,
+    kInteger,
+    kFloat,
+    kDouble,
+    kString
+};
 
-LeafKind KindOf(const DWXParseTreeNode& leaf) {
+NodeKind KindOf(const DWXParseTreeNode& node) {
     // Exact classes only. Comparing the type_info addresses first is cheap
     // and almost always decides; the full comparison is the fallback.
     static const struct {
         const std::type_info* type;
-        LeafKind kind;
+        NodeKind kind;
     } kKinds[] = {
-        {&typeid(PTNInteger), LeafKind::kInteger}, {&typeid(PTNString), LeafKind::kString},
-        {&typeid(PTNDouble), LeafKind::kDouble},   {&typeid(PTNBool), LeafKind::kBool},
-        {&typeid(PTNChar), LeafKind::kChar},       {&typeid(PTNFloat), LeafKind::kFloat},
+        {&typeid(PTNInteger), NodeKind::kInteger},
+        {&typeid(PTNString), NodeKind::kString},
+        {&typeid(PTNSubTree), NodeKind::kSubTree},
+        {&typeid(PTNDouble), NodeKind::kDouble},
+        {&typeid(PTNBool), NodeKind::kBool},
+        {&typeid(PTNChar), NodeKind::kChar},
+        {&typeid(PTNFloat), NodeKind::kFloat},
+        {&typeid(PTNStringList), NodeKind::kOtherLeaf},
+        {&typeid(PTNDoubleList), NodeKind::kOtherLeaf},
+        {&typeid(PTNIntegerList), NodeKind::kOtherLeaf},
+        {&typeid(PTNInteger32List), NodeKind::kOtherLeaf},
+        {&typeid(PTNBase64), NodeKind::kOtherLeaf},
     };
-    const std::type_info& type = typeid(leaf);
+    const std::type_info& type = typeid(node);
     for (const auto& entry : kKinds) {
         if (&type == entry.type) {
             return entry.kind;
@@ -127,15 +147,12 @@ LeafKind KindOf(const DWXParseTreeNode& leaf) {
             return entry.kind;
         }
     }
-    return LeafKind::kOther;
+    return NodeKind::kOther;
 }
 
-// The subtree that `node` is when the writer nests it: its class name is
-// PTNSubTree (ignoring case) and it is one.
+// A node of another class is nested when its class name is PTNSubTree
+// (ignoring case) and it is a subtree.
 const PTNSubTree* AsNestedSubTree(const DWXParseTreeNode& node) {
-    if (typeid(node) == typeid(PTNSubTree)) {
-        return static_cast<const PTNSubTree*>(&node);
-    }
     const char* className = node.GetClassName();
     if (className == nullptr || _stricmp(className, "PTNSubTree") != 0) {
         return nullptr;
@@ -155,33 +172,66 @@ class TreeWriter {
         struct Open {
             const PTNSubTree* tree;
             int next;
+            int top;
         };
         std::vector<Open> open;
         OpeningLine(root, level);
-        open.push_back({&root, 0});
+        open.push_back({&root, 0, root.GetChildren()->GetMaxIndex()});
+        PrefetchFirst(root, open.back().top);
         while (!open.empty()) {
             Open& current = open.back();
             const size_t depth = level + open.size() - 1;
-            const DWXArray& children = *current.tree->GetChildren();
-            if (current.next >= children.GetMaxIndex()) {
+            if (current.next >= current.top) {
                 ClosingLine(depth);
                 open.pop_back();
                 continue;
+            }
+            const DWXArray& children = *current.tree->GetChildren();
+            if (current.next + kAhead < current.top) {
+                Prefetch(children[current.next + kAhead]);
             }
             auto* child = static_cast<const DWXParseTreeNode*>(children[current.next++]);
             if (child == nullptr) {
                 continue;
             }
-            if (const PTNSubTree* subtree = AsNestedSubTree(*child)) {
+            const NodeKind kind = KindOf(*child);
+            const PTNSubTree* subtree = nullptr;
+            if (kind == NodeKind::kSubTree) {
+                subtree = static_cast<const PTNSubTree*>(child);
+            } else if (kind == NodeKind::kOther) {
+                subtree = AsNestedSubTree(*child);
+            }
+            if (subtree != nullptr) {
                 OpeningLine(*subtree, depth + 1);
-                open.push_back({subtree, 0});  // `current` is not used after this
+                // `current` is not used after this.
+                open.push_back({subtree, 0, subtree->GetChildren()->GetMaxIndex()});
+                PrefetchFirst(*subtree, open.back().top);
             } else {
-                Leaf(*child, depth);
+                Leaf(*child, kind, depth);
             }
         }
     }
 
   private:
+    // The nodes of a large tree lie all over the heap; asking for the next
+    // few children early overlaps their cache misses.
+    static constexpr int kAhead = 8;
+
+    static void Prefetch(const void* address) {
+#if defined(__GNUC__)
+        __builtin_prefetch(address);
+#else
+        (void)address;
+#endif
+    }
+
+    static void PrefetchFirst(const PTNSubTree& tree, int top) {
+        const DWXArray& children = *tree.GetChildren();
+        for (int i = 0; i < top && i < kAhead; ++i) {
+            Prefetch(children[i]);
+        }
+    }
+
     // 2 * level blanks, from a run of blanks kept long enough.
     const char* Blanks(size_t count) {
         if (oBlanks.size() < count) {
@@ -249,35 +299,37 @@ class TreeWriter {
         EndLine(at);
     }
 
-    void Leaf(const DWXParseTreeNode& leaf, size_t level) {
-        switch (KindOf(leaf)) {
-            case LeafKind::kInteger:
+    void Leaf(const DWXParseTreeNode& leaf, NodeKind kind, size_t level) {
+        switch (kind) {
+            case NodeKind::kInteger:
                 LeafTail(PutInteger(LeafHead(level, leaf, "Integer", kNumberTextMax),
                                     static_cast<const PTNInteger&>(leaf).GetValue()));
                 return;
-            case LeafKind::kBool: {
+            case NodeKind::kBool: {
                 const char* text = BoolText(static_cast<const PTNBool&>(leaf).GetValue());
                 const size_t size = strlen(text);
                 LeafTail(Put(LeafHead(level, leaf, "Bool", size), text, size));
                 return;
             }
-            case LeafKind::kChar:
+            case NodeKind::kChar:
                 LeafTail(PutCharacter(LeafHead(level, leaf, "Char", 1),
                                       static_cast<const PTNChar&>(leaf).GetValue()));
                 return;
-            case LeafKind::kFloat:
+            case NodeKind::kFloat:
                 LeafTail(
                     PutFixed(LeafHead(level, leaf, "Float", kNumberTextMax),
                              static_cast<double>(static_cast<const PTNFloat&>(leaf).GetValue())));
                 return;
-            case LeafKind::kDouble:
+            case NodeKind::kDouble:
                 LeafTail(PutShortest(LeafHead(level, leaf, "Double", kNumberTextMax),
                                      static_cast<const PTNDouble&>(leaf).GetValue()));
                 return;
-            case LeafKind::kString:
+            case NodeKind::kString:
                 StringLeaf(level, leaf, static_cast<const PTNString&>(leaf).GetValue());
                 return;
-            case LeafKind::kOther:
+            case NodeKind::kSubTree:
+            case NodeKind::kOtherLeaf:
+            case NodeKind::kOther:
                 break;
         }
         const char* keyword = TypeKeyword(leaf.GetClassName());
