@@ -3,7 +3,9 @@
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 
+#include <stdint.h>
 #include <stdlib.h>
+#include <string.h>
 
 #include <memory>
 #include <string>
@@ -79,6 +81,84 @@ TEST(Base64Test, DecodingStopsAtTheFirstPadOrForeignByte) {
                                     {"YR==", "a"}};
     for (const auto& c : cases) {
         EXPECT_EQ(base64_decode(c[0]), c[1]) << c[0];
+    }
+}
+
+// Plain one-character-at-a-time codec to hold the block code against.
+const char kAlphabet[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+
+std::string ReferenceEncode(const std::string& bytes) {
+    std::string text;
+    for (size_t i = 0; i < bytes.size(); i += 3) {
+        unsigned group = static_cast<unsigned char>(bytes[i]) << 16;
+        const size_t n = bytes.size() - i < 3 ? bytes.size() - i : 3;
+        for (size_t k = 1; k < n; ++k) {
+            group |= static_cast<unsigned char>(bytes[i + k]) << (16 - 8 * k);
+        }
+        for (size_t k = 0; k < 4; ++k) {
+            text += k <= n ? kAlphabet[(group >> (18 - 6 * k)) & 0x3F] : '=';
+        }
+    }
+    return text;
+}
+
+std::string ReferenceDecode(const std::string& text) {
+    std::string bytes;
+    unsigned group = 0;
+    size_t count = 0;
+    for (char c : text) {
+        const char* at = c != '\0' ? strchr(kAlphabet, c) : nullptr;
+        if (at == nullptr) {
+            break;
+        }
+        group = group << 6 | static_cast<unsigned>(at - kAlphabet);
+        if (++count % 4 == 0) {
+            bytes += {static_cast<char>(group >> 16), static_cast<char>(group >> 8),
+                      static_cast<char>(group)};
+        }
+    }
+    if (count % 4 >= 2) {
+        group <<= 6 * (4 - count % 4);
+        bytes += static_cast<char>(group >> 16);
+        if (count % 4 == 3) {
+            bytes += static_cast<char>(group >> 8);
+        }
+    }
+    return bytes;
+}
+
+// Lengths around every block size the codec may use, with every byte value.
+TEST(Base64Test, LongInputsMatchThePlainCodec) {
+    std::string bytes;
+    uint32_t state = 12345;
+    for (int i = 0; i < 5000; ++i) {
+        state = state * 1103515245u + 12345u;
+        bytes += static_cast<char>(state >> 23);
+    }
+    for (size_t length : {15, 16, 17, 23, 24, 25, 47, 48, 49, 100, 1000, 4099, 5000}) {
+        const std::string input = bytes.substr(bytes.size() - length);
+        const std::string text = Encode(input);
+        EXPECT_EQ(text, ReferenceEncode(input)) << length;
+        EXPECT_EQ(base64_decode(text), input) << length;
+    }
+}
+
+// A foreign byte anywhere in a long text ends the decoding exactly there,
+// whatever the byte; a byte of the alphabet is decoded as such.
+TEST(Base64Test, EveryByteValueAtEveryPlaceOfABlock) {
+    const std::string valid = ReferenceEncode(std::string(60, '\xA7') + "+/+/?>?>") + "AAAA";
+    ASSERT_EQ(valid.size(), 96u);
+    for (int b = 0; b < 256; ++b) {
+        for (size_t at : {0, 5, 15, 16, 30, 47, 63, 70, 95}) {
+            std::string text = valid;
+            text[at] = static_cast<char>(b);
+            ASSERT_EQ(base64_decode(text), ReferenceDecode(text)) << b << " at " << at;
+        }
+    }
+    for (size_t at = 0; at < valid.size(); ++at) {
+        std::string text = valid;
+        text[at] = '=';
+        ASSERT_EQ(base64_decode(text), ReferenceDecode(valid.substr(0, at))) << at;
     }
 }
 

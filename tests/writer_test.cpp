@@ -3,11 +3,15 @@
 #include <gtest/gtest.h>
 #include <services/utilhub.h>
 
+#include <math.h>
+#include <services/rtprim.h>
 #include <stdio.h>
 #include <stdlib.h>
 
+#include <climits>
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace {
 
@@ -89,6 +93,128 @@ TEST(WriterTest, EveryLeafClassAndEmptyFields) {
     for (DWXObject* child = iter.Current(); child != nullptr; child = iter.Next()) {
         EXPECT_EQ(std::string(child->GetClassName(), 3), "PTN");
     }
+}
+
+std::string Printed(const char* format, double value) {
+    char text[400];
+    snprintf(text, sizeof text, format, value);
+    return text;
+}
+
+std::string Text(const DWXParseTreeNode& node) {
+    char* text = node.GetAsString();
+    std::string result(text != nullptr ? text : "(null)");
+    free(text);
+    return result;
+}
+
+// Every leaf line holds what the leaf's GetAsString renders, and the numbers
+// are the printf texts that define them.
+TEST(WriterTest, LeafValuesMatchGetAsStringAndPrintf) {
+    struct Case {
+        DWXParseTreeNode* node;
+        std::string value;
+    };
+    const std::string longText(100000, 'w');
+    const std::vector<Case> cases = {
+        {new PTNInteger("i", 0), "0"},
+        {new PTNInteger("i", INT_MIN), "-2147483648"},
+        {new PTNInteger("i", INT_MAX), "2147483647"},
+        {new PTNBool("b", 0), "FALSE"},
+        {new PTNBool("b", -1), "TRUE"},
+        {new PTNChar("c", '\xE9'), "\xE9"},
+        {new PTNChar("c", 0), ""},
+        {new PTNFloat("f", -0.25f), "-0.250000"},
+        {new PTNFloat("f", 1e30f), Printed("%f", 1e30f)},
+        {new PTNFloat("f", 0.0078125f), Printed("%f", 0.0078125)},  // a tie, rounded to even
+        {new PTNFloat("f", -INFINITY), Printed("%f", -INFINITY)},
+        {new PTNFloat("f", NAN), Printed("%f", NAN)},
+        {new PTNDouble("d", 0.1), MkName(0.1, -1)},
+        {new PTNDouble("d", -1.7976931348623157e308), MkName(-1.7976931348623157e308, -1)},
+        {new PTNDouble("d", 5e-324), MkName(5e-324, -1)},
+        {new PTNDouble("d", 1e21), MkName(1e21, -1)},
+        {new PTNDouble("d", -0.0), "-0"},
+        {new PTNDouble("d", INFINITY), MkName(INFINITY, -1)},
+        {new PTNString("s", nullptr), "\\q\\q"},
+        {new PTNString("s", ""), "\"\""},
+        {new PTNString("s", "a\"b\\c\nd"), "\"a\\qb\\\\c\\nd\""},
+        {new PTNString("s", longText.c_str()), "\"" + longText + "\""},
+    };
+    PTNSubTree tree("t");
+    std::string expected = "(t SubTree\n";
+    for (const Case& c : cases) {
+        tree.AddChild(c.node);
+        EXPECT_EQ(Text(*c.node), c.value) << c.node->GetClassName();
+        expected += std::string("  (") + c.node->GetName() + " " + (c.node->GetClassName() + 3) +
+                    " " + c.value + ")\n";
+    }
+    expected += ")\n";
+    EXPECT_EQ(Text(tree), expected);
+    EXPECT_EQ(PTNFloat("f", 1e30f).GetValue(), 1e30f);
+}
+
+// Subclasses render through their own GetClassName and GetAsString, exact
+// library classes or not; only real subtrees named PTNSubTree nest.
+struct Celsius : PTNInteger {
+    Celsius(const char* name, int value) : PTNInteger(name, value) {}
+    const char* GetClassName() const override { return "PTNCelsius"; }
+    char* GetAsString() const override { return HSPrintf("%d C", GetValue()); }
+};
+struct Quiet : PTNString {
+    Quiet() : PTNString("q", "secret") {}
+    char* GetAsString() const override { return nullptr; }
+};
+struct Group : PTNSubTree {
+    Group() : PTNSubTree("g") { AddChild(new PTNInteger("in", 1)); }
+    const char* GetClassName() const override { return "PTNGroup"; }
+};
+struct Impostor : PTNBool {
+    Impostor() : PTNBool("fake", 1) {}
+    const char* GetClassName() const override { return "ptnsubtree"; }
+};
+struct Folder : PTNSubTree {
+    Folder() : PTNSubTree("folder") { AddChild(new PTNChar("nl", '\n')); }
+    const char* GetClassName() const override { return "PTNSUBTREE"; }
+};
+
+TEST(WriterTest, HostSubclassesRenderThemselves) {
+    PTNSubTree tree("t");
+    tree.AddChild(new Celsius("temp", 21));
+    tree.AddChild(new Quiet());
+    tree.AddChild(new Group());
+    tree.AddChild(new Impostor());
+    tree.AddChild(new Folder());
+    EXPECT_EQ(Lines(tree),
+              "(t SubTree|  (temp Celsius 21 C)|  (q String )|"
+              "  (g Group (g Group\n  (in Integer 1)\n)\n)|  (fake subtree TRUE)|"
+              "  (folder SUBTREE|    (nl Char \n)|  )|)|");
+}
+
+// A file receives the text in blocks; what arrives is the text, whatever the
+// sizes of the lines and of the whole.
+TEST(WriterTest, LargeTreesReachTheFileWhole) {
+    PTNSubTree tree("big");
+    for (int i = 0; i < 3000; ++i) {
+        auto* item = new PTNSubTree("item");
+        tree.AddChild(item);
+        item->AddChild(new PTNInteger("id", i));
+        item->AddChild(new PTNDouble("scale", i / 8.0));
+        item->AddChild(new PTNString("label", std::string(i % 97 * 7, 'x').c_str()));
+    }
+    tree.AddChild(new PTNString("huge", std::string(200000, 'h').c_str()));
+    char* buffer = nullptr;
+    size_t size = 0;
+    FILE* stream = open_memstream(&buffer, &size);
+    tree.WriteToFile(stream);
+    fclose(stream);
+    char** list = tree.GetAsStringList(0);
+    char* joined = StringListToBuffer(list);
+    EXPECT_EQ(CountStringList(list), 3 * 3000 + 2 + 3000 * 2 + 1);
+    EXPECT_EQ(std::string(buffer, size), joined);
+    EXPECT_EQ(Text(tree), joined);
+    free(joined);
+    DestroyStringList(list);
+    free(buffer);
 }
 
 }  // namespace

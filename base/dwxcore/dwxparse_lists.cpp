@@ -11,9 +11,12 @@
 
 #include <string>
 
+#include "dwxparse_numbers.h"
 #include "dwxparse_token.h"
 
 namespace {
+
+using namespace dwxparse_detail;
 
 // A new heap copy of `count` elements, or null for an empty list (a count
 // below 1 or no source array).
@@ -56,15 +59,17 @@ void ParseElements(const char* text, int& count, T*& values, Convert convert) {
     count = words_count;
 }
 
-// Joins the element texts with one blank; `format` returns a borrowed text.
-template <class T, class Format>
-char* JoinElements(int count, const T* values, Format format) {
+// Joins the element texts with one blank; `put` writes one element's text
+// of at most kNumberTextMax bytes and returns its end.
+template <class T, class Put>
+char* JoinElements(int count, const T* values, Put put) {
     std::string text;
+    char element[kNumberTextMax + 1];
     for (int i = 0; i < count; ++i) {
         if (i > 0) {
             text += ' ';
         }
-        text += format(values[i]);
+        text.append(element, put(element, values[i]));
     }
     return HString(text.c_str());
 }
@@ -93,16 +98,8 @@ double ReadDouble(const char* word) {
     return atof(word);
 }
 
-const char* FormatInteger(int value) {
-    return MkName("%d", value);
-}
-
-const char* FormatWidenedInteger(int value) {
-    return MkName("%f", static_cast<double>(value));
-}
-
-const char* FormatDouble(double value) {
-    return MkName(value, -1);
+char* PutWidenedInteger(char* out, int value) {
+    return PutFixed(out, static_cast<double>(value));
 }
 
 }  // namespace
@@ -218,7 +215,7 @@ DWXParseTreeNode* PTNIntegerList::Copy() {
 }
 
 char* PTNIntegerList::GetAsString() const {
-    return JoinElements(nCount, pnValues, FormatInteger);
+    return JoinElements(nCount, pnValues, PutInteger);
 }
 
 void PTNIntegerList::SetFrom(DWXParseTreeNode* other) {
@@ -275,7 +272,7 @@ DWXParseTreeNode* PTNInteger32List::Copy() {
 }
 
 char* PTNInteger32List::GetAsString() const {
-    return JoinElements(nCount, pnValues, FormatWidenedInteger);
+    return JoinElements(nCount, pnValues, PutWidenedInteger);
 }
 
 void PTNInteger32List::SetFrom(DWXParseTreeNode* other) {
@@ -332,7 +329,7 @@ DWXParseTreeNode* PTNDoubleList::Copy() {
 }
 
 char* PTNDoubleList::GetAsString() const {
-    return JoinElements(nCount, pdValues, FormatDouble);
+    return JoinElements(nCount, pdValues, PutShortest);
 }
 
 void PTNDoubleList::SetFrom(DWXParseTreeNode* other) {

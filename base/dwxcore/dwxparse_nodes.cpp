@@ -7,13 +7,22 @@
 
 #include <string>
 
+#include "dwxparse_numbers.h"
 #include "dwxparse_token.h"
 
 namespace {
 
+using namespace dwxparse_detail;
+
 // Numeric setters take a null text as an empty one.
 const char* TextOrEmpty(const char* text) {
     return text != nullptr ? text : "";
+}
+
+// A heap copy of the text that a Put function wrote into `buffer`.
+char* HeapText(char* buffer, char* end) {
+    *end = '\0';
+    return HString(buffer);
 }
 
 }  // namespace
@@ -64,7 +73,7 @@ DWXParseTreeNode* PTNBool::Copy() {
 }
 
 char* PTNBool::GetAsString() const {
-    return HString(nValue != 0 ? "TRUE" : "FALSE");
+    return HString(BoolText(nValue));
 }
 
 void PTNBool::SetFrom(DWXParseTreeNode* other) {
@@ -93,7 +102,8 @@ DWXParseTreeNode* PTNChar::Copy() {
 
 char* PTNChar::GetAsString() const {
     // "%c" of 0 writes the terminator itself, so 0 renders as the empty text.
-    return HString(MkName("%c", static_cast<int>(cValue)));
+    char text[2];
+    return HeapText(text, PutCharacter(text, cValue));
 }
 
 void PTNChar::SetFrom(DWXParseTreeNode* other) {
@@ -121,7 +131,8 @@ DWXParseTreeNode* PTNInteger::Copy() {
 }
 
 char* PTNInteger::GetAsString() const {
-    return HString(MkName("%d", nValue));
+    char text[kNumberTextMax + 1];
+    return HeapText(text, PutInteger(text, nValue));
 }
 
 void PTNInteger::SetFrom(DWXParseTreeNode* other) {
@@ -149,7 +160,8 @@ DWXParseTreeNode* PTNFloat::Copy() {
 }
 
 char* PTNFloat::GetAsString() const {
-    return HString(MkName("%f", static_cast<double>(fValue)));
+    char text[kNumberTextMax + 1];
+    return HeapText(text, PutFixed(text, static_cast<double>(fValue)));
 }
 
 void PTNFloat::SetFrom(DWXParseTreeNode* other) {
@@ -177,7 +189,8 @@ DWXParseTreeNode* PTNDouble::Copy() {
 }
 
 char* PTNDouble::GetAsString() const {
-    return HString(MkName(dValue, -1));
+    char text[kNumberTextMax + 1];
+    return HeapText(text, PutShortest(text, dValue));
 }
 
 void PTNDouble::SetFrom(DWXParseTreeNode* other) {

@@ -6,11 +6,22 @@
 
 #include <stdlib.h>
 
+#include <typeinfo>
+#include <utility>
+#include <vector>
+
 namespace {
 
 // Whole names, ignoring case; a null name on either side matches nothing.
 bool NameMatches(const DWXParseTreeNode* node, const char* name) {
     return name != nullptr && node->GetName() != nullptr && _stricmp(node->GetName(), name) == 0;
+}
+
+// A subtree of exactly this library's class. Deep trees are walked with
+// explicit work lists rather than recursion; only these subtrees are walked
+// that way, so a host's subclass keeps its own Copy and destructor.
+bool IsPlainSubTree(const DWXObject* node) {
+    return typeid(*node) == typeid(PTNSubTree);
 }
 
 }  // namespace
@@ -103,13 +114,54 @@ PTNSubTree& PTNSubTree::operator=(const PTNSubTree& other) {
 }
 
 PTNSubTree::~PTNSubTree() {
+    // Deleting a child subtree deletes its own children, so a deep tree would
+    // recurse once per level. Instead every plain subtree below is listed,
+    // each after its parent, and the list is emptied from its end: a subtree's
+    // children go while it is still in place, and by the time it goes with its
+    // parent it has no children left, so no destructor recurses.
+    std::vector<PTNSubTree*> subtrees;
+    auto listPlainChildren = [&subtrees](const PTNSubTree& parent) {
+        const int top = parent.oChildren.GetMaxIndex();
+        for (int i = 0; i < top; ++i) {
+            DWXObject* child = parent.oChildren[i];
+            if (child != nullptr && IsPlainSubTree(child)) {
+                subtrees.push_back(static_cast<PTNSubTree*>(child));
+            }
+        }
+    };
+    listPlainChildren(*this);
+    for (size_t i = 0; i < subtrees.size(); ++i) {
+        listPlainChildren(*subtrees[i]);
+    }
+    for (auto subtree = subtrees.rbegin(); subtree != subtrees.rend(); ++subtree) {
+        (*subtree)->oChildren.DestroyContents();
+    }
     oChildren.DestroyContents();
 }
 
 void PTNSubTree::CopyChildrenFrom(const PTNSubTree& other) {
-    DWXIter iter(&other.oChildren);
-    for (DWXObject* child = iter.Current(); child != nullptr; child = iter.Next()) {
-        AddChild(static_cast<DWXParseTreeNode*>(child)->Copy());
+    // Plain subtrees are copied here, each new one with the name of its
+    // source and filled later from the work list, so deep trees do not
+    // recurse; every other child copies itself. Children keep their order.
+    std::vector<std::pair<const PTNSubTree*, PTNSubTree*>> pending{{&other, this}};
+    while (!pending.empty()) {
+        const std::pair<const PTNSubTree*, PTNSubTree*> work = pending.back();
+        pending.pop_back();
+        const DWXArray& children = work.first->oChildren;
+        const int top = children.GetMaxIndex();
+        for (int i = 0; i < top; ++i) {
+            auto* child = static_cast<DWXParseTreeNode*>(children[i]);
+            if (child == nullptr) {
+                continue;
+            }
+            if (IsPlainSubTree(child)) {
+                auto* copy = new PTNSubTree(child->GetName());
+                work.second->AddChild(copy);
+                pending.emplace_back(static_cast<const PTNSubTree*>(child), copy);
+            } else {
+                work.second->AddChild(child->Copy());
+            }
+        }
     }
 }
 
@@ -208,20 +260,33 @@ void PTNSubTree::SetFrom(PTNSubTree* other, const ExceptionList& exceptions) {
     if (other == nullptr) {
         return;
     }
-    DWXIter iter(&oChildren);
-    for (DWXObject* object = iter.Current(); object != nullptr; object = iter.Next()) {
-        auto* child = static_cast<DWXParseTreeNode*>(object);
-        if (child->GetName() == nullptr || exceptions.IsMember(child->GetName())) {
+    // Depth first in child order, as a recursion would go, with the open
+    // subtree pairs on an explicit stack so that deep trees do not recurse.
+    struct Level {
+        PTNSubTree* tree;
+        PTNSubTree* source;
+        int next;
+    };
+    std::vector<Level> levels{{this, other, 0}};
+    while (!levels.empty()) {
+        Level& level = levels.back();
+        if (level.next >= level.tree->oChildren.GetMaxIndex()) {
+            levels.pop_back();
+            continue;
+        }
+        auto* child = static_cast<DWXParseTreeNode*>(level.tree->oChildren[level.next++]);
+        if (child == nullptr || child->GetName() == nullptr ||
+            exceptions.IsMember(child->GetName())) {
             continue;  // an excepted subtree keeps everything below it too
         }
-        // Only the first namesake in `other` counts, whatever its class.
-        DWXParseTreeNode* source = other->GetChild(child->GetName());
+        // Only the first namesake in `source` counts, whatever its class.
+        DWXParseTreeNode* source = level.source->GetChild(child->GetName());
         if (source == nullptr) {
             continue;
         }
         if (auto* subtree = dynamic_cast<PTNSubTree*>(child)) {
             if (auto* sourceSubtree = dynamic_cast<PTNSubTree*>(source)) {
-                subtree->SetFrom(sourceSubtree, exceptions);
+                levels.push_back({subtree, sourceSubtree, 0});  // `level` is not used after this
             }
         } else {
             child->SetFrom(source);

@@ -1,83 +1,413 @@
-// The writer: a subtree as indented lines of the text format.
+// The writer: a subtree as indented lines of the text format. The lines are
+// built in one pass into one buffer, which a file receives in blocks and the
+// string forms take whole; nested subtrees are walked with an explicit stack,
+// so the depth of a tree costs neither stack nor copies of its lines.
 #include <dwxcore/dwxparse.h>
 
 #include <services/rtprim.h>
-#include <services/utilhub.h>
 
 #include <stdlib.h>
 #include <string.h>
 
 #include <string>
+#include <typeinfo>
 #include <vector>
+
+#include "dwxparse_numbers.h"
 
 namespace {
 
-typedef std::vector<std::string> Lines;
+using namespace dwxparse_detail;
 
 const char* TextOrEmpty(const char* text) {
     return text != nullptr ? text : "";
 }
 
 // The type keyword of the text format: the class name without "PTN".
-const char* TypeKeyword(const DWXParseTreeNode& node) {
-    const char* name = TextOrEmpty(node.GetClassName());
+const char* TypeKeyword(const char* className) {
+    const char* name = TextOrEmpty(className);
     return strlen(name) >= 3 ? name + 3 : name;
 }
 
-void AppendFormatted(Lines& lines, char* text) {
-    lines.emplace_back(text);
-    free(text);
+char* Put(char* at, const char* text, size_t size) {
+    memcpy(at, text, size);
+    return at + size;
 }
 
-// Opening line, one line per leaf, nested subtrees one level deeper, closing
-// line. A subtree sits at the indent of its level; its leaves two blanks in.
-void WriteLines(const PTNSubTree& tree, int level, Lines& lines) {
-    const std::string indent(2 * static_cast<size_t>(level), ' ');
-    AppendFormatted(lines, HSPrintf("%s(%s %s", indent.c_str(), TextOrEmpty(tree.GetName()),
-                                    TypeKeyword(tree)));
-    DWXIter iter(tree.GetChildren());
-    for (DWXObject* object = iter.Current(); object != nullptr; object = iter.Next()) {
-        auto* child = static_cast<const DWXParseTreeNode*>(object);
-        auto* subtree = dynamic_cast<const PTNSubTree*>(child);
-        if (subtree != nullptr && _stricmp(child->GetClassName(), "PTNSubTree") == 0) {
-            WriteLines(*subtree, level + 1, lines);
-            continue;
+// Text appended at the end of one buffer. Given a stream, the buffer is
+// written to it whenever the next piece would not fit; otherwise it grows and
+// is handed over whole.
+class TextOut {
+  public:
+    static constexpr size_t kBlock = 64 * 1024;
+
+    // A stream receives blocks of kBlock bytes; without one the text starts
+    // in a smaller buffer that grows.
+    explicit TextOut(FILE* stream)
+        : poStream(stream), nUsed(0), nCapacity(stream != nullptr ? kBlock : 1024) {
+        pcData = static_cast<char*>(HMalloc(nCapacity));
+    }
+    TextOut(const TextOut&) = delete;
+    TextOut& operator=(const TextOut&) = delete;
+    ~TextOut() { free(pcData); }
+
+    // Room for `size` more bytes; the caller writes there and commits.
+    char* Room(size_t size) {
+        if (size > nCapacity - nUsed) {
+            MakeRoom(size);
         }
-        char* value = child->GetAsString();
-        AppendFormatted(lines,
-                        HSPrintf("%s  (%s %s %s)", indent.c_str(), TextOrEmpty(child->GetName()),
-                                 TypeKeyword(*child), TextOrEmpty(value)));
+        return pcData + nUsed;
+    }
+    void Commit(const char* end) { nUsed = static_cast<size_t>(end - pcData); }
+
+    const char* Data() const { return pcData; }
+    size_t Size() const { return nUsed; }
+
+    // Writes what the buffer holds to the stream.
+    void Flush() {
+        if (nUsed != 0) {
+            fwrite(pcData, 1, nUsed, poStream);
+            nUsed = 0;
+        }
+    }
+
+    // The text as a heap C string; the buffer is empty afterwards.
+    char* Release() {
+        char* text = static_cast<char*>(HRealloc(pcData, nUsed + 1));
+        text[nUsed] = '\0';
+        pcData = nullptr;
+        nUsed = nCapacity = 0;
+        return text;
+    }
+
+  private:
+    void MakeRoom(size_t size) {
+        if (poStream != nullptr) {
+            Flush();
+        }
+        if (size > nCapacity - nUsed) {
+            size_t capacity = nCapacity;
+            while (size > capacity - nUsed) {
+                capacity *= 2;
+            }
+            pcData = static_cast<char*>(HRealloc(pcData, capacity));
+            nCapacity = capacity;
+        }
+    }
+
+    FILE* poStream;
+    char* pcData;
+    size_t nUsed;
+    size_t nCapacity;
+};
+
+// The library's own node classes. The writer nests plain subtrees and
+// renders the scalar leaves itself; the other leaves, and every other class,
+// a host's subclass included, render through their GetAsString.
+enum class NodeKind {
+    kOther,
+    kSubTree,
+    kOtherLeaf,  // a library leaf without a rendering of the writer's own
+    kBool,
+    kChar,
+    kInteger,
+    kFloat,
+    kDouble,
+    kString
+};
+
+NodeKind KindOf(const DWXParseTreeNode& node) {
+    // Exact classes only. Comparing the type_info addresses first is cheap
+    // and almost always decides; the full comparison is the fallback.
+    static const struct {
+        const std::type_info* type;
+        NodeKind kind;
+    } kKinds[] = {
+        {&typeid(PTNInteger), NodeKind::kInteger},
+        {&typeid(PTNString), NodeKind::kString},
+        {&typeid(PTNSubTree), NodeKind::kSubTree},
+        {&typeid(PTNDouble), NodeKind::kDouble},
+        {&typeid(PTNBool), NodeKind::kBool},
+        {&typeid(PTNChar), NodeKind::kChar},
+        {&typeid(PTNFloat), NodeKind::kFloat},
+        {&typeid(PTNStringList), NodeKind::kOtherLeaf},
+        {&typeid(PTNDoubleList), NodeKind::kOtherLeaf},
+        {&typeid(PTNIntegerList), NodeKind::kOtherLeaf},
+        {&typeid(PTNInteger32List), NodeKind::kOtherLeaf},
+        {&typeid(PTNBase64), NodeKind::kOtherLeaf},
+    };
+    const std::type_info& type = typeid(node);
+    for (const auto& entry : kKinds) {
+        if (&type == entry.type) {
+            return entry.kind;
+        }
+    }
+    for (const auto& entry : kKinds) {
+        if (type == *entry.type) {
+            return entry.kind;
+        }
+    }
+    return NodeKind::kOther;
+}
+
+// A node of another class is nested when its class name is PTNSubTree
+// (ignoring case) and it is a subtree.
+const PTNSubTree* AsNestedSubTree(const DWXParseTreeNode& node) {
+    const char* className = node.GetClassName();
+    if (className == nullptr || _stricmp(className, "PTNSubTree") != 0) {
+        return nullptr;
+    }
+    return dynamic_cast<const PTNSubTree*>(&node);
+}
+
+// Writes the lines of a subtree: opening line, one line per leaf, nested
+// subtrees one level deeper, closing line. A subtree sits at the indent of
+// its level, its leaves two blanks further in. Every line ends in '\n'; when
+// `lineEnds` is given, the offset after each line is recorded there.
+class TreeWriter {
+  public:
+    TreeWriter(TextOut& out, std::vector<size_t>* lineEnds) : oOut(out), poLineEnds(lineEnds) {}
+
+    void Write(const PTNSubTree& root, size_t level) {
+        struct Open {
+            const PTNSubTree* tree;
+            int next;
+            int top;
+        };
+        std::vector<Open> open;
+        OpeningLine(root, level);
+        open.push_back({&root, 0, root.GetChildren()->GetMaxIndex()});
+        PrefetchFirst(root, open.back().top);
+        while (!open.empty()) {
+            Open& current = open.back();
+            const size_t depth = level + open.size() - 1;
+            if (current.next >= current.top) {
+                ClosingLine(depth);
+                open.pop_back();
+                continue;
+            }
+            const DWXArray& children = *current.tree->GetChildren();
+            if (current.next + kAhead < current.top) {
+                Prefetch(children[current.next + kAhead]);
+            }
+            auto* child = static_cast<const DWXParseTreeNode*>(children[current.next++]);
+            if (child == nullptr) {
+                continue;
+            }
+            const NodeKind kind = KindOf(*child);
+            const PTNSubTree* subtree = nullptr;
+            if (kind == NodeKind::kSubTree) {
+                subtree = static_cast<const PTNSubTree*>(child);
+            } else if (kind == NodeKind::kOther) {
+                subtree = AsNestedSubTree(*child);
+            }
+            if (subtree != nullptr) {
+                OpeningLine(*subtree, depth + 1);
+                // `current` is not used after this.
+                open.push_back({subtree, 0, subtree->GetChildren()->GetMaxIndex()});
+                PrefetchFirst(*subtree, open.back().top);
+            } else {
+                Leaf(*child, kind, depth);
+            }
+        }
+    }
+
+  private:
+    // The nodes of a large tree lie all over the heap; asking for the next
+    // few children early overlaps their cache misses.
+    static constexpr int kAhead = 8;
+
+    static void Prefetch(const void* address) {
+#if defined(__GNUC__)
+        __builtin_prefetch(address);
+#else
+        (void)address;
+#endif
+    }
+
+    static void PrefetchFirst(const PTNSubTree& tree, int top) {
+        const DWXArray& children = *tree.GetChildren();
+        for (int i = 0; i < top && i < kAhead; ++i) {
+            Prefetch(children[i]);
+        }
+    }
+
+    // 2 * level blanks, from a run of blanks kept long enough.
+    const char* Blanks(size_t count) {
+        if (oBlanks.size() < count) {
+            oBlanks.append(count - oBlanks.size() + 64, ' ');
+        }
+        return oBlanks.data();
+    }
+
+    void EndLine(char* at) {
+        *at++ = '\n';
+        oOut.Commit(at);
+        if (poLineEnds != nullptr) {
+            poLineEnds->push_back(oOut.Size());
+        }
+    }
+
+    // "%s(%s %s": indent, name, keyword.
+    void OpeningLine(const PTNSubTree& tree, size_t level) {
+        const size_t indent = 2 * level;
+        const char* blanks = Blanks(indent);
+        const char* name = TextOrEmpty(tree.GetName());
+        const size_t nameSize = strlen(name);
+        const char* keyword = TypeKeyword(tree.GetClassName());
+        const size_t keywordSize = strlen(keyword);
+        char* at = oOut.Room(indent + nameSize + keywordSize + 3);
+        at = Put(at, blanks, indent);
+        *at++ = '(';
+        at = Put(at, name, nameSize);
+        *at++ = ' ';
+        at = Put(at, keyword, keywordSize);
+        EndLine(at);
+    }
+
+    // "%s)": indent.
+    void ClosingLine(size_t level) {
+        const size_t indent = 2 * level;
+        const char* blanks = Blanks(indent);
+        char* at = oOut.Room(indent + 2);
+        at = Put(at, blanks, indent);
+        *at++ = ')';
+        EndLine(at);
+    }
+
+    // "%s  (%s %s " with room for `valueRoom` bytes of value and ")\n" after
+    // it; returns where the value goes.
+    char* LeafHead(size_t level, const DWXParseTreeNode& leaf, const char* keyword,
+                   size_t valueRoom) {
+        const size_t indent = 2 * level + 2;
+        const char* blanks = Blanks(indent);
+        const char* name = TextOrEmpty(leaf.GetName());
+        const size_t nameSize = strlen(name);
+        const size_t keywordSize = strlen(keyword);
+        char* at = oOut.Room(indent + nameSize + keywordSize + valueRoom + 5);
+        at = Put(at, blanks, indent);
+        *at++ = '(';
+        at = Put(at, name, nameSize);
+        *at++ = ' ';
+        at = Put(at, keyword, keywordSize);
+        *at++ = ' ';
+        return at;
+    }
+
+    void LeafTail(char* at) {
+        *at++ = ')';
+        EndLine(at);
+    }
+
+    void Leaf(const DWXParseTreeNode& leaf, NodeKind kind, size_t level) {
+        switch (kind) {
+            case NodeKind::kInteger:
+                LeafTail(PutInteger(LeafHead(level, leaf, "Integer", kNumberTextMax),
+                                    static_cast<const PTNInteger&>(leaf).GetValue()));
+                return;
+            case NodeKind::kBool: {
+                const char* text = BoolText(static_cast<const PTNBool&>(leaf).GetValue());
+                const size_t size = strlen(text);
+                LeafTail(Put(LeafHead(level, leaf, "Bool", size), text, size));
+                return;
+            }
+            case NodeKind::kChar:
+                LeafTail(PutCharacter(LeafHead(level, leaf, "Char", 1),
+                                      static_cast<const PTNChar&>(leaf).GetValue()));
+                return;
+            case NodeKind::kFloat:
+                LeafTail(
+                    PutFixed(LeafHead(level, leaf, "Float", kNumberTextMax),
+                             static_cast<double>(static_cast<const PTNFloat&>(leaf).GetValue())));
+                return;
+            case NodeKind::kDouble:
+                LeafTail(PutShortest(LeafHead(level, leaf, "Double", kNumberTextMax),
+                                     static_cast<const PTNDouble&>(leaf).GetValue()));
+                return;
+            case NodeKind::kString:
+                StringLeaf(level, leaf, static_cast<const PTNString&>(leaf).GetValue());
+                return;
+            case NodeKind::kSubTree:
+            case NodeKind::kOtherLeaf:
+            case NodeKind::kOther:
+                break;
+        }
+        const char* keyword = TypeKeyword(leaf.GetClassName());
+        char* value = leaf.GetAsString();
+        const char* text = TextOrEmpty(value);
+        const size_t size = strlen(text);
+        LeafTail(Put(LeafHead(level, leaf, keyword, size), text, size));
         free(value);
     }
-    AppendFormatted(lines, HSPrintf("%s)", indent.c_str()));
-}
+
+    // The value as PTNString::GetAsString renders it: a quoted token with
+    // '"', line feed and backslash escaped as \q, \n and \\; \q\q for null.
+    void StringLeaf(size_t level, const DWXParseTreeNode& leaf, const char* value) {
+        if (value == nullptr) {
+            LeafTail(Put(LeafHead(level, leaf, "String", 4), "\\q\\q", 4));
+            return;
+        }
+        const size_t size = strlen(value);
+        char* at = LeafHead(level, leaf, "String", 2 * size + 2);
+        *at++ = '"';
+        for (const char* p = value; *p != '\0'; ++p) {
+            switch (*p) {
+                case '"':
+                    *at++ = '\\';
+                    *at++ = 'q';
+                    break;
+                case '\n':
+                    *at++ = '\\';
+                    *at++ = 'n';
+                    break;
+                case '\\':
+                    *at++ = '\\';
+                    *at++ = '\\';
+                    break;
+                default:
+                    *at++ = *p;
+            }
+        }
+        *at++ = '"';
+        LeafTail(at);
+    }
+
+    TextOut& oOut;
+    std::vector<size_t>* poLineEnds;
+    std::string oBlanks;
+};
 
 }  // namespace
 
 char** PTNSubTree::GetAsStringList(int level) const {
-    Lines lines;
-    WriteLines(*this, level > 0 ? level : 0, lines);
-    char** list = static_cast<char**>(HCalloc(sizeof(char*), lines.size() + 1));
-    for (size_t i = 0; i < lines.size(); ++i) {
-        list[i] = HString(lines[i].c_str());
+    TextOut out(nullptr);
+    std::vector<size_t> lineEnds;
+    TreeWriter(out, &lineEnds).Write(*this, level > 0 ? static_cast<size_t>(level) : 0);
+    char** list = static_cast<char**>(HMalloc(sizeof(char*) * (lineEnds.size() + 1)));
+    size_t start = 0;
+    for (size_t i = 0; i < lineEnds.size(); ++i) {
+        const size_t size = lineEnds[i] - 1 - start;  // without its '\n'
+        list[i] = static_cast<char*>(HMalloc(size + 1));
+        memcpy(list[i], out.Data() + start, size);
+        list[i][size] = '\0';
+        start = lineEnds[i];
     }
+    list[lineEnds.size()] = nullptr;
     return list;
 }
 
 char* PTNSubTree::GetAsString() const {
-    char** lines = GetAsStringList(0);
-    char* text = StringListToBuffer(lines);
-    DestroyStringList(lines);
-    return text;
+    // The lines, each followed by '\n', as StringListToBuffer joins them.
+    TextOut out(nullptr);
+    TreeWriter(out, nullptr).Write(*this, 0);
+    return out.Release();
 }
 
 void PTNSubTree::WriteToFile(FILE* stream) const {
     if (stream == nullptr) {
         return;
     }
-    Lines lines;
-    WriteLines(*this, 0, lines);
-    for (const std::string& line : lines) {
-        fprintf(stream, "%s\n", line.c_str());
-    }
+    TextOut out(stream);
+    TreeWriter(out, nullptr).Write(*this, 0);
+    out.Flush();
 }
