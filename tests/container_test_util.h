@@ -1,0 +1,58 @@
+// Helpers shared by the container tests: dumps captured the way a host reads
+// them, and views of the protected bookkeeping of the containers.
+#pragma once
+
+#include <dwxcore/dwxobject.h>
+
+#include <stdio.h>
+#include <stdlib.h>
+
+#include <string>
+#include <vector>
+
+// What `dump` writes to a stream, read back through open_memstream.
+template <typename Writer>
+std::string Captured(Writer dump) {
+    char* buffer = nullptr;
+    size_t length = 0;
+    FILE* stream = open_memstream(&buffer, &length);
+    dump(stream);
+    fclose(stream);
+    std::string text(buffer, length);
+    free(buffer);
+    return text;
+}
+
+// The line DWXObject::Dump writes for `object`.
+inline std::string ObjectLine(const DWXObject* object) {
+    char line[128];
+    snprintf(line, sizeof line, "%s:%p\n", object->GetClassName(), (const void*)object);
+    return line;
+}
+
+// The members a DWXIter walk yields, in order.
+inline std::vector<DWXObject*> Walk(const DWXContainer& container) {
+    std::vector<DWXObject*> members;
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(&container); member; member = iter.Next()) {
+        members.push_back(member);
+    }
+    return members;
+}
+
+// Exposes the slot bookkeeping of an array class for assertions.
+template <typename Array>
+class SlotView : public Array {
+  public:
+    using Array::Array;
+    using Array::operator=;
+    int Capacity() const { return this->nCapacity; }
+    int Top() const { return this->nTop; }
+    bool HasBuffer() const { return this->ppoItems != nullptr; }
+};
+
+class BagView : public DWXBag {
+  public:
+    using DWXBag::DWXBag;
+    int Capacity() const { return nCapacity; }
+};

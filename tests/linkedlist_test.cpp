@@ -1,0 +1,174 @@
+#include "container_test_util.h"
+#include "counting_object.h"
+
+#include <dwxcore/dwxobject.h>
+
+#include <gtest/gtest.h>
+
+#include <vector>
+
+DEFINE_COUNTING_OBJECT_COUNTERS();
+
+namespace {
+
+using Members = std::vector<DWXObject*>;
+
+// Every member from StartNode to EndNode, nulls included.
+Members Nodes(const DWXLinkedList& list) {
+    Members members;
+    for (DWXListNode* node = list.StartNode(); node != list.EndNode(); node = node->poNext) {
+        members.push_back(node->poObject);
+        EXPECT_EQ(node->poNext->poPrev, node);
+    }
+    return members;
+}
+
+class LinkedListTest : public ::testing::Test {
+  protected:
+    CountingObject a{1}, b{2}, c{3}, d{4}, e{5};
+};
+
+TEST_F(LinkedListTest, NewListIsEmpty) {
+    DWXLinkedList list;
+    EXPECT_EQ(list.GetCount(), 0);
+    EXPECT_EQ(list.StartNode(), list.EndNode());
+    EXPECT_EQ(Captured([&](FILE* f) { list.Dump(f); }), "nCount=0\n");
+    EXPECT_EQ(Walk(list), Members{});
+    EXPECT_EQ(list.Find(&a), nullptr);
+    EXPECT_EQ(list.Remove(&a), 0);
+}
+
+TEST_F(LinkedListTest, InsertAppendPrependPlaceNodes) {
+    DWXLinkedList list;
+    list.Append(&a);
+    list.Append(&b);
+    list.Prepend(&c);
+    EXPECT_EQ(Nodes(list), (Members{&c, &a, &b}));
+    list.Insert(&d, list.Find(&a));
+    EXPECT_EQ(Nodes(list), (Members{&c, &d, &a, &b}));
+    list.Insert(&e, list.EndNode());
+    list.Add(&a);
+    EXPECT_EQ(Nodes(list), (Members{&c, &d, &a, &b, &e, &a}));
+    EXPECT_EQ(list.GetCount(), 6);
+    EXPECT_EQ(Walk(list), Nodes(list));
+}
+
+TEST_F(LinkedListTest, RemoveByNodeOrPointerTakesTheFirstOnly) {
+    DWXLinkedList list;
+    for (DWXObject* o : {&a, &b, &a, &c}) {
+        list.Add(o);
+    }
+    list.Remove(list.Find(&b));
+    EXPECT_EQ(Nodes(list), (Members{&a, &a, &c}));
+    EXPECT_EQ(list.Remove(&a), 1);
+    EXPECT_EQ(list.IsMember(&a), 1);
+    EXPECT_EQ(Nodes(list), (Members{&a, &c}));
+    EXPECT_EQ(list.Remove(&a), 1);
+    EXPECT_EQ(list.Remove(&a), 0);
+    EXPECT_EQ(list.IsMember(&a), 0);
+    EXPECT_EQ(list.GetCount(), 1);
+}
+
+TEST_F(LinkedListTest, NullNodesAndTheSentinelAreIgnored) {
+    DWXLinkedList list;
+    list.Append(&a);
+    list.Insert(&b, nullptr);
+    list.Remove(static_cast<DWXListNode*>(nullptr));
+    list.Remove(list.EndNode());
+    EXPECT_EQ(Nodes(list), (Members{&a}));
+    EXPECT_EQ(list.GetCount(), 1);
+}
+
+TEST_F(LinkedListTest, NullMembersAreStoredDumpedAndEndWalks) {
+    DWXLinkedList list;
+    list.Append(&a);
+    list.Append(nullptr);
+    list.Append(&b);
+    EXPECT_EQ(list.GetCount(), 3);
+    EXPECT_EQ(Walk(list), (Members{&a}));
+    EXPECT_EQ(list.IsMember(nullptr), 1);
+    EXPECT_EQ(Captured([&](FILE* f) { list.Dump(f); }),
+              "nCount=3\n" + ObjectLine(&a) + "\nNULL\n" + ObjectLine(&b) + "\n");
+    DWXArray array(&list);
+    EXPECT_EQ(array.GetCount(), 1);
+    EXPECT_EQ(list.Remove(static_cast<const DWXObject*>(nullptr)), 1);
+    EXPECT_EQ(Walk(list), (Members{&a, &b}));
+}
+
+TEST_F(LinkedListTest, EmptyLeavesAUsableList) {
+    CountingObject::Reset();
+    DWXLinkedList list;
+    list.Append(&a);
+    list.Append(&b);
+    list.Append(&c);
+    list.Empty();
+    EXPECT_EQ(list.GetCount(), 0);
+    EXPECT_EQ(list.StartNode(), list.EndNode());
+    EXPECT_EQ(CountingObject::destroyed, 0);
+    list.Append(&d);
+    EXPECT_EQ(Nodes(list), (Members{&d}));
+}
+
+TEST_F(LinkedListTest, WalksSurviveChangesAwayFromTheirNode) {
+    DWXLinkedList list;
+    list.Append(&a);
+    list.Append(&b);
+    list.Append(&c);
+    DWXIter iter(&list);
+    EXPECT_EQ(*iter, &a);
+    list.Insert(&d, list.Find(&b));  // after the walk's node: visited
+    list.Prepend(&e);                // before it: not visited
+    list.Remove(&c);                 // another node: safe
+    EXPECT_EQ(iter.Next(), &d);
+    EXPECT_EQ(iter.Next(), &b);
+    EXPECT_EQ(iter.Next(), nullptr);
+    list.Append(&c);
+    EXPECT_EQ(iter.Next(), nullptr);  // an ended walk stays ended
+
+    // Bound with SetTarget and never started, a walk begins at the front.
+    DWXIter unstarted;
+    unstarted.SetTarget(&list);
+    EXPECT_EQ(unstarted.Next(), &e);
+    EXPECT_EQ(unstarted.Next(), &a);
+}
+
+TEST_F(LinkedListTest, CopiesOwnTheirNodes) {
+    DWXLinkedList source;
+    source.Append(&a);
+    source.Append(nullptr);
+    source.Append(&b);
+
+    DWXLinkedList copy(source);
+    EXPECT_EQ(Nodes(copy), (Members{&a, nullptr, &b}));
+    EXPECT_NE(copy.StartNode(), source.StartNode());
+    copy.Remove(&a);
+    EXPECT_EQ(Nodes(source), (Members{&a, nullptr, &b}));
+
+    DWXLinkedList assigned;
+    assigned.Append(&c);
+    assigned = source;
+    EXPECT_EQ(Nodes(assigned), (Members{&a, nullptr, &b}));
+    EXPECT_EQ(assigned.GetCount(), 3);
+    assigned = *&assigned;
+    EXPECT_EQ(Nodes(assigned), (Members{&a, nullptr, &b}));
+
+    DWXLinkedList empty;
+    assigned = empty;
+    EXPECT_EQ(assigned.GetCount(), 0);
+    EXPECT_EQ(assigned.StartNode(), assigned.EndNode());
+}
+
+TEST_F(LinkedListTest, DestroyContentsDeletesMembersAndNodes) {
+    CountingObject::Reset();
+    DWXLinkedList list;
+    for (int i = 0; i < 4; ++i) {
+        list.Append(new CountingObject(i));
+    }
+    list.Prepend(list.StartNode()->poObject);  // the same member twice
+    list.DestroyContents();
+    EXPECT_EQ(CountingObject::destroyed, 4);
+    EXPECT_EQ(list.GetCount(), 0);
+    EXPECT_EQ(list.StartNode(), list.EndNode());
+}
+
+}  // namespace
