@@ -1,0 +1,435 @@
+// The parse tree: named, typed values in a tree of subtrees and leaves, with
+// the line-oriented text form that every leaf renders and reads, and the
+// Base64 codec that carries byte data through it.
+//
+// Ownership throughout: every name, text, list and array passed in is copied;
+// getters lend the node's own storage; texts and nodes handed out as new are
+// the caller's (texts are released with free(), nodes with delete). A subtree
+// owns its children and deletes them with itself.
+#pragma once
+
+#include <dwxcore/dwxcore_export.h>
+#include <dwxcore/dwxobject.h>
+
+#include <stdio.h>
+
+#include <string>
+
+class PTNSubTree;
+
+// Base of every node: a name owned by the node and a borrowed pointer to the
+// subtree that holds it (null until the node is added to one).
+class DWXCORE_API DWXParseTreeNode : public DWXObject {
+  public:
+    explicit DWXParseTreeNode(const char* name);
+    // Does not detach the node from its parent; the parent is the owner.
+    ~DWXParseTreeNode() override;
+
+    // Borrowed; valid until SetName or destruction.
+    const char* GetName() const { return pcName; }
+    void SetName(const char* name);
+    // Only records the pointer; it does not add the node to that subtree.
+    void SetParent(PTNSubTree* parent) { poParent = parent; }
+    PTNSubTree* GetParentRef() const { return poParent; }
+
+    const char* GetClassName() const override = 0;
+    // A new node of the same class with its own copies of name and value and
+    // a null parent. Caller owns it.
+    virtual DWXParseTreeNode* Copy() = 0;
+    // The value as text of the file format. Caller frees with free().
+    virtual char* GetAsString() const = 0;
+    // Takes other's value when other is an instance of this node's class;
+    // otherwise (null included) nothing changes. Name and parent never change.
+    virtual void SetFrom(DWXParseTreeNode* other) = 0;
+
+  protected:
+    // Copies the name; the copy has a null parent.
+    DWXParseTreeNode(const DWXParseTreeNode& other);
+    // Copies the name; the parent stays, as the node stays where it is.
+    DWXParseTreeNode& operator=(const DWXParseTreeNode& other);
+
+  private:
+    char* pcName;
+    PTNSubTree* poParent;
+};
+
+// ---------------------------------------------------------------------------
+// Scalar leaves. Copies and assignments copy deeply, like Copy().
+
+// Any value other than 0 is true and is kept as given.
+class DWXCORE_API PTNBool : public DWXParseTreeNode {
+  public:
+    PTNBool(const char* name, int value);
+    PTNBool(const PTNBool& other) = default;
+    PTNBool& operator=(const PTNBool& other) = default;
+    ~PTNBool() override;
+
+    int GetValue() const { return nValue; }
+    void SetValue(int value) { nValue = value; }
+    // 1 for "TRUE" in any case, 0 for every other text and for null.
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // "TRUE" or "FALSE".
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    int nValue;
+};
+
+class DWXCORE_API PTNChar : public DWXParseTreeNode {
+  public:
+    PTNChar(const char* name, char value);
+    PTNChar(const PTNChar& other) = default;
+    PTNChar& operator=(const PTNChar& other) = default;
+    ~PTNChar() override;
+
+    char GetValue() const { return cValue; }
+    void SetValue(char value) { cValue = value; }
+    // The first byte of the text; 0 for an empty or null text.
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // The character itself; the empty text for 0.
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    char cValue;
+};
+
+class DWXCORE_API PTNInteger : public DWXParseTreeNode {
+  public:
+    PTNInteger(const char* name, int value);
+    PTNInteger(const PTNInteger& other) = default;
+    PTNInteger& operator=(const PTNInteger& other) = default;
+    ~PTNInteger() override;
+
+    int GetValue() const { return nValue; }
+    void SetValue(int value) { nValue = value; }
+    // atoi of the text; null is taken as an empty text (0).
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // "%d".
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    int nValue;
+};
+
+class DWXCORE_API PTNFloat : public DWXParseTreeNode {
+  public:
+    PTNFloat(const char* name, float value);
+    PTNFloat(const PTNFloat& other) = default;
+    PTNFloat& operator=(const PTNFloat& other) = default;
+    ~PTNFloat() override;
+
+    float GetValue() const { return fValue; }
+    void SetValue(float value) { fValue = value; }
+    // atof of the text, narrowed; null is taken as an empty text (0).
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // "%f" of the value widened to double: six decimals.
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    float fValue;
+};
+
+class DWXCORE_API PTNDouble : public DWXParseTreeNode {
+  public:
+    PTNDouble(const char* name, double value);
+    PTNDouble(const PTNDouble& other) = default;
+    PTNDouble& operator=(const PTNDouble& other) = default;
+    ~PTNDouble() override;
+
+    double GetValue() const { return dValue; }
+    void SetValue(double value) { dValue = value; }
+    // atof of the text; null is taken as an empty text (0).
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // The shortest decimal text that atof reads back to the same value.
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    double dValue;
+};
+
+// The value is a heap copy owned by the node and may be null.
+class DWXCORE_API PTNString : public DWXParseTreeNode {
+  public:
+    PTNString(const char* name, const char* value);
+    PTNString(const PTNString& other);
+    PTNString& operator=(const PTNString& other);
+    ~PTNString() override;
+
+    // Borrowed, may be null; valid until the value is replaced.
+    const char* GetValue() const { return pcValue; }
+    void SetValue(const char* value);
+    // Reads a quoted token: escapes undone, translation forms and the
+    // MkTokenString list form expanded. Null gives an empty value.
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // The value as a quoted token; a null value gives \q\q.
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    char* pcValue;
+};
+
+// ---------------------------------------------------------------------------
+// List leaves. Copies and assignments copy deeply, like Copy().
+
+// The value is a string list owned by the node; it may be null.
+class DWXCORE_API PTNStringList : public DWXParseTreeNode {
+  public:
+    // Copies the list; a null list keeps a null value.
+    PTNStringList(const char* name, char* const* value);
+    PTNStringList(const PTNStringList& other);
+    PTNStringList& operator=(const PTNStringList& other);
+    ~PTNStringList() override;
+
+    // Borrowed, may be null; valid until the value is replaced.
+    char** GetValue() const { return ppcValue; }
+    // Copies the list; a null list gives a null value.
+    void SetValue(char* const* value);
+    // Each token is read as PTNString::SetAsString reads its text. The tokens
+    // are not changed; a null or empty token list gives a list without entries.
+    void SetAsStringList(char* const* tokens);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    // Every entry as a quoted token, separated by one blank; the empty text
+    // for a null list or one without entries.
+    char* GetAsString() const override;
+    // Takes a copy of other's list whatever it holds, empty or null included.
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    char** ppcValue;
+};
+
+// An array of int written as "%d" words and read with atoi.
+class DWXCORE_API PTNIntegerList : public DWXParseTreeNode {
+  public:
+    // Copies `count` values; a count below 1 gives an empty list.
+    PTNIntegerList(const char* name, int count, const int* values);
+    PTNIntegerList(const PTNIntegerList& other);
+    PTNIntegerList& operator=(const PTNIntegerList& other);
+    ~PTNIntegerList() override;
+
+    // Stores the count through `count` when it is not null. Borrowed; null
+    // for a list constructed empty.
+    int* GetValue(int* count) const;
+    // Copies `count` values (count must not be negative).
+    void SetValue(int count, const int* values);
+    // One element per white-space separated word; null is taken as "".
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    char* GetAsString() const override;
+    // Takes other's elements only when other has at least one, so the list
+    // never empties through a merge.
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    int nCount;
+    int* pnValues;
+};
+
+// An array of int written with six decimals and read with atof, truncated.
+class DWXCORE_API PTNInteger32List : public DWXParseTreeNode {
+  public:
+    PTNInteger32List(const char* name, int count, const int* values);
+    PTNInteger32List(const PTNInteger32List& other);
+    PTNInteger32List& operator=(const PTNInteger32List& other);
+    ~PTNInteger32List() override;
+
+    int* GetValue(int* count) const;
+    void SetValue(int count, const int* values);
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    int nCount;
+    int* pnValues;
+};
+
+// An array of double written as the shortest text atof reads back.
+class DWXCORE_API PTNDoubleList : public DWXParseTreeNode {
+  public:
+    PTNDoubleList(const char* name, int count, const double* values);
+    PTNDoubleList(const PTNDoubleList& other);
+    PTNDoubleList& operator=(const PTNDoubleList& other);
+    ~PTNDoubleList() override;
+
+    double* GetValue(int* count) const;
+    void SetValue(int count, const double* values);
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    DWXParseTreeNode* Copy() override;
+    char* GetAsString() const override;
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    int nCount;
+    double* pdValues;
+};
+
+// ---------------------------------------------------------------------------
+// Base64
+
+// The standard alphabet of RFC 4648, with '=' padding and no line breaks.
+DWXCORE_API std::string base64_encode(const unsigned char* bytes, unsigned int length);
+// Decodes up to the first '=' or byte outside the alphabet; the rest is
+// ignored. A final group of two or three characters gives one or two bytes.
+DWXCORE_API std::string base64_decode(const std::string& text);
+
+// Byte data kept as Base64 text (owned, null when the node holds no data).
+class DWXCORE_API PTNBase64 : public DWXParseTreeNode {
+  public:
+    // Encodes the data; null data or a length of 0 leaves the node without text.
+    PTNBase64(const char* name, const unsigned char* data, unsigned int length);
+    PTNBase64(const PTNBase64& other);
+    PTNBase64& operator=(const PTNBase64& other);
+    ~PTNBase64() override;
+
+    // Decodes `text`, or the node's own text when it is null, into a new
+    // buffer of exactly the decoded size; the count goes to *length when
+    // length is not null. 0 bytes give a block free() accepts. Caller frees
+    // with free().
+    unsigned char* Decode(const char* text, unsigned int* length) const;
+    // Stores a copy of the text verbatim (no check); null clears the text.
+    void SetAsString(const char* text);
+
+    const char* GetClassName() const override;
+    // Decodes and encodes afresh, so the copy's text is in canonical form.
+    DWXParseTreeNode* Copy() override;
+    // The text verbatim; the empty text for a node without text.
+    char* GetAsString() const override;
+    // Decodes other's text and stores its canonical encoding (no text for 0
+    // bytes). With the node itself the data is kept.
+    void SetFrom(DWXParseTreeNode* other) override;
+
+  private:
+    // base64_encode of the bytes as a heap C string.
+    static char* Encode(const unsigned char* data, unsigned int length);
+
+    char* pcText;
+};
+
+// ---------------------------------------------------------------------------
+// Subtree and merge exceptions
+
+// Names that a merge leaves alone, compared whole and ignoring case. Owns its
+// copies of the names. Copies and assignments copy deeply.
+class DWXCORE_API ExceptionList {
+  public:
+    ExceptionList();
+    ExceptionList(const ExceptionList& other);
+    ExceptionList& operator=(const ExceptionList& other);
+    ~ExceptionList();
+
+    // A null name is ignored; a name already present is added again.
+    void Add(const char* name);
+    // 0 for null.
+    int IsMember(const char* name) const;
+
+  private:
+    void Append(const char* name);
+    void Clear();
+
+    char** ppcNames;
+    int nCount;
+    int nCapacity;
+};
+
+// The interior node: an ordered sequence of children of any class, owned and
+// deleted with the subtree. Lookups visit only the direct children, in order,
+// compare whole names ignoring case and take the first match; a null name
+// matches nothing.
+class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
+  public:
+    explicit PTNSubTree(const char* name);
+    // Deep copy: own children whose parent is the new subtree.
+    PTNSubTree(const PTNSubTree& other);
+    PTNSubTree& operator=(const PTNSubTree& other);
+    ~PTNSubTree() override;
+
+    // Appends the node and takes ownership; null is ignored. A node must not
+    // be added twice or to two subtrees.
+    void AddChild(DWXParseTreeNode* child);
+    // Borrowed; for reading and iteration.
+    const DWXArray* GetChildren() const { return &oChildren; }
+
+    // The first child of that name whose class name equals `type` ignoring
+    // case (any class when `type` is null). Borrowed; null when none.
+    DWXParseTreeNode* GetChild(const char* name, const char* type = nullptr) const;
+
+    // The value of the first child of that name. When there is none, or it
+    // is not of a class the reader accepts, the default is returned.
+    // PTNBool or PTNInteger; default 0.
+    int GetChildAsBool(const char* name) const;
+    // PTNChar; default 0.
+    char GetChildAsChar(const char* name) const;
+    // PTNDouble; default 0.0.
+    double GetChildAsDouble(const char* name) const;
+    // PTNInteger or PTNBool; default 0.
+    int GetChildAsInteger(const char* name) const;
+    // PTNString; borrowed, null when the child's value is null. The default
+    // is a static empty text, never null, not to be freed.
+    const char* GetChildAsString(const char* name) const;
+    // PTNStringList; borrowed, may be null. Default null.
+    char** GetChildAsStringList(const char* name) const;
+    // The number of direct children of that name; 0 for null.
+    int GetNumberOfOccurence(const char* name) const;
+
+    const char* GetClassName() const override;
+    // A deep copy owned by the caller.
+    DWXParseTreeNode* Copy() override;
+    PTNSubTree* DeepCopy();
+    // Does nothing: subtrees merge through the two-argument SetFrom.
+    void SetFrom(DWXParseTreeNode* other) override;
+    // Merges other's leaf values into this tree: each child not named in
+    // `exceptions` takes its value from other's first child of the same name
+    // (subtrees recursively). Nothing is added, removed or reordered.
+    void SetFrom(PTNSubTree* other, const ExceptionList& exceptions);
+
+    // The lines of this subtree in the text format, indented for `level`
+    // (0 or more). Caller frees with DestroyStringList.
+    char** GetAsStringList(int level) const;
+    // The lines joined into one buffer. Caller frees with free().
+    char* GetAsString() const override;
+    // Writes the lines at the stream's position; does not flush or close.
+    void WriteToFile(FILE* stream) const;
+
+    // Reading from text: defined in dwxparse_reader.cpp.
+
+  private:
+    void CopyChildrenFrom(const PTNSubTree& other);
+
+    DWXArray oChildren;
+};
+
+// File validation: defined in dwxparse_validate.cpp.

@@ -1,0 +1,236 @@
+// The node base class and the six scalar leaves.
+#include <dwxcore/dwxparse.h>
+
+#include <services/rtprim.h>
+
+#include <stdlib.h>
+
+#include <string>
+
+#include "dwxparse_token.h"
+
+namespace {
+
+// Numeric setters take a null text as an empty one.
+const char* TextOrEmpty(const char* text) {
+    return text != nullptr ? text : "";
+}
+
+}  // namespace
+
+// ---------------------------------------------------------------------------
+// DWXParseTreeNode
+
+DWXParseTreeNode::DWXParseTreeNode(const char* name) : pcName(HString(name)), poParent(nullptr) {}
+
+DWXParseTreeNode::DWXParseTreeNode(const DWXParseTreeNode& other)
+    : DWXObject(other), pcName(HString(other.pcName)), poParent(nullptr) {}
+
+DWXParseTreeNode& DWXParseTreeNode::operator=(const DWXParseTreeNode& other) {
+    if (this != &other) {
+        SetName(other.pcName);
+    }
+    return *this;
+}
+
+DWXParseTreeNode::~DWXParseTreeNode() {
+    free(pcName);
+    pcName = nullptr;
+    poParent = nullptr;
+}
+
+void DWXParseTreeNode::SetName(const char* name) {
+    char* copy = HString(name);  // copied first: `name` may be our own buffer
+    free(pcName);
+    pcName = copy;
+}
+
+// ---------------------------------------------------------------------------
+// PTNBool
+
+PTNBool::PTNBool(const char* name, int value) : DWXParseTreeNode(name), nValue(value) {}
+PTNBool::~PTNBool() {}
+
+void PTNBool::SetAsString(const char* text) {
+    nValue = (text != nullptr && _stricmp(text, "TRUE") == 0) ? 1 : 0;
+}
+
+const char* PTNBool::GetClassName() const {
+    return "PTNBool";
+}
+
+DWXParseTreeNode* PTNBool::Copy() {
+    return new PTNBool(GetName(), nValue);
+}
+
+char* PTNBool::GetAsString() const {
+    return HString(nValue != 0 ? "TRUE" : "FALSE");
+}
+
+void PTNBool::SetFrom(DWXParseTreeNode* other) {
+    if (auto* source = dynamic_cast<PTNBool*>(other)) {
+        nValue = source->nValue;
+    }
+}
+
+// ---------------------------------------------------------------------------
+// PTNChar
+
+PTNChar::PTNChar(const char* name, char value) : DWXParseTreeNode(name), cValue(value) {}
+PTNChar::~PTNChar() {}
+
+void PTNChar::SetAsString(const char* text) {
+    cValue = TextOrEmpty(text)[0];
+}
+
+const char* PTNChar::GetClassName() const {
+    return "PTNChar";
+}
+
+DWXParseTreeNode* PTNChar::Copy() {
+    return new PTNChar(GetName(), cValue);
+}
+
+char* PTNChar::GetAsString() const {
+    // "%c" of 0 writes the terminator itself, so 0 renders as the empty text.
+    return HString(MkName("%c", static_cast<int>(cValue)));
+}
+
+void PTNChar::SetFrom(DWXParseTreeNode* other) {
+    if (auto* source = dynamic_cast<PTNChar*>(other)) {
+        cValue = source->cValue;
+    }
+}
+
+// ---------------------------------------------------------------------------
+// PTNInteger
+
+PTNInteger::PTNInteger(const char* name, int value) : DWXParseTreeNode(name), nValue(value) {}
+PTNInteger::~PTNInteger() {}
+
+void PTNInteger::SetAsString(const char* text) {
+    nValue = atoi(TextOrEmpty(text));
+}
+
+const char* PTNInteger::GetClassName() const {
+    return "PTNInteger";
+}
+
+DWXParseTreeNode* PTNInteger::Copy() {
+    return new PTNInteger(GetName(), nValue);
+}
+
+char* PTNInteger::GetAsString() const {
+    return HString(MkName("%d", nValue));
+}
+
+void PTNInteger::SetFrom(DWXParseTreeNode* other) {
+    if (auto* source = dynamic_cast<PTNInteger*>(other)) {
+        nValue = source->nValue;
+    }
+}
+
+// ---------------------------------------------------------------------------
+// PTNFloat
+
+PTNFloat::PTNFloat(const char* name, float value) : DWXParseTreeNode(name), fValue(value) {}
+PTNFloat::~PTNFloat() {}
+
+void PTNFloat::SetAsString(const char* text) {
+    fValue = static_cast<float>(atof(TextOrEmpty(text)));
+}
+
+const char* PTNFloat::GetClassName() const {
+    return "PTNFloat";
+}
+
+DWXParseTreeNode* PTNFloat::Copy() {
+    return new PTNFloat(GetName(), fValue);
+}
+
+char* PTNFloat::GetAsString() const {
+    return HString(MkName("%f", static_cast<double>(fValue)));
+}
+
+void PTNFloat::SetFrom(DWXParseTreeNode* other) {
+    if (auto* source = dynamic_cast<PTNFloat*>(other)) {
+        fValue = source->fValue;
+    }
+}
+
+// ---------------------------------------------------------------------------
+// PTNDouble
+
+PTNDouble::PTNDouble(const char* name, double value) : DWXParseTreeNode(name), dValue(value) {}
+PTNDouble::~PTNDouble() {}
+
+void PTNDouble::SetAsString(const char* text) {
+    dValue = atof(TextOrEmpty(text));
+}
+
+const char* PTNDouble::GetClassName() const {
+    return "PTNDouble";
+}
+
+DWXParseTreeNode* PTNDouble::Copy() {
+    return new PTNDouble(GetName(), dValue);
+}
+
+char* PTNDouble::GetAsString() const {
+    return HString(MkName(dValue, -1));
+}
+
+void PTNDouble::SetFrom(DWXParseTreeNode* other) {
+    if (auto* source = dynamic_cast<PTNDouble*>(other)) {
+        dValue = source->dValue;
+    }
+}
+
+// ---------------------------------------------------------------------------
+// PTNString
+
+PTNString::PTNString(const char* name, const char* value)
+    : DWXParseTreeNode(name), pcValue(HString(value)) {}
+
+PTNString::PTNString(const PTNString& other)
+    : DWXParseTreeNode(other), pcValue(HString(other.pcValue)) {}
+
+PTNString& PTNString::operator=(const PTNString& other) {
+    if (this != &other) {
+        DWXParseTreeNode::operator=(other);
+        SetValue(other.pcValue);
+    }
+    return *this;
+}
+
+PTNString::~PTNString() {
+    free(pcValue);
+}
+
+void PTNString::SetValue(const char* value) {
+    char* copy = HString(value);  // copied first: `value` may be our own buffer
+    free(pcValue);
+    pcValue = copy;
+}
+
+void PTNString::SetAsString(const char* text) {
+    SetValue(UnquoteToken(text).c_str());
+}
+
+const char* PTNString::GetClassName() const {
+    return "PTNString";
+}
+
+DWXParseTreeNode* PTNString::Copy() {
+    return new PTNString(GetName(), pcValue);
+}
+
+char* PTNString::GetAsString() const {
+    return QuoteToken(pcValue);
+}
+
+void PTNString::SetFrom(DWXParseTreeNode* other) {
+    if (auto* source = dynamic_cast<PTNString*>(other)) {
+        SetValue(source->pcValue);
+    }
+}

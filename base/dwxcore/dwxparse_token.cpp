@@ -1,0 +1,135 @@
+// Quoting, unquoting and the value expansions of the token syntax.
+#include "dwxparse_token.h"
+
+#include <services/rtprim.h>
+#include <services/utilhub.h>
+
+#include <string.h>
+
+namespace {
+
+const char kListKeyword[] = "MkTokenString";
+const std::string::size_type kListKeywordLength = sizeof(kListKeyword) - 1;
+
+// The '@' forms: "@@message" and "@context:message" become the translation of
+// the message; anything else starting with '@' stays as it is.
+void ExpandTranslationPrefix(std::string& value) {
+    if (value.size() < 2 || value[0] != '@') {
+        return;
+    }
+    // `_` may hand back its argument, so the message is copied out first.
+    if (value[1] == '@') {
+        const std::string message(value, 2);
+        value = _(message.c_str());
+        return;
+    }
+    const std::string::size_type mark = value.find_first_of(": @", 1);
+    if (mark != std::string::npos && value[mark] == ':') {
+        const std::string message(value, mark + 1);
+        value = _(message.c_str());
+    }
+}
+
+}  // namespace
+
+char* QuoteToken(const char* value) {
+    if (value == nullptr) {
+        return HString("\\q\\q");
+    }
+    std::string token;
+    token.reserve(2 * strlen(value) + 2);
+    token += '"';
+    for (const char* p = value; *p != '\0'; ++p) {
+        switch (*p) {
+            case '"':
+                token += "\\q";
+                break;
+            case '\n':
+                token += "\\n";
+                break;
+            case '\\':
+                token += "\\\\";
+                break;
+            default:
+                token += *p;
+        }
+    }
+    token += '"';
+    return HString(token.c_str());
+}
+
+std::string UnquoteToken(const char* token) {
+    std::string value;
+    if (token == nullptr) {
+        return value;
+    }
+    value.reserve(strlen(token) + 1);
+    for (const char* p = token; *p != '\0'; ++p) {
+        if (*p == '"') {
+            continue;
+        }
+        if (*p != '\\') {
+            value += *p;
+            continue;
+        }
+        ++p;
+        if (*p == '\0') {
+            break;  // a lone final backslash stands for nothing
+        }
+        value += *p == 'q' ? '"' : *p == 'n' ? '\n' : *p;
+    }
+    ExpandTranslationPrefix(value);
+    ExpandMkTokenString(value);
+    return value;
+}
+
+void ExpandMkTokenString(std::string& value) {
+    const std::string::size_type first = FindFirstNonWhitespace(value, 0);
+    if (first == std::string::npos) {
+        return;  // blank: nothing to expand
+    }
+    const std::string::size_type keyword = value.find(kListKeyword, first);
+    if (keyword == std::string::npos) {
+        ExpandTranslationCall(value);
+        return;
+    }
+    if (keyword != first) {
+        return;  // the keyword must be the first word
+    }
+    const std::string::size_type last = FindLastNonWhitespace(value);
+    const std::string::size_type open = FindFirstNonWhitespace(value, first + kListKeywordLength);
+    if (open == std::string::npos || value[open] != '(' || value[last] != ')') {
+        return;
+    }
+    const std::string arguments = value.substr(open + 1, last - open - 1);
+    char** items = TokenizeDelim(arguments.c_str(), ",");
+    value.clear();
+    for (char** item = items; *item != nullptr; ++item) {
+        std::string entry(*item);
+        std::string trimmed(entry);
+        if (TrimWhitespace(trimmed) == "NULL") {
+            break;  // NULL ends the list
+        }
+        ExpandTranslationCall(entry);
+        if (!value.empty()) {
+            value += '|';
+        }
+        value += entry;
+    }
+    DestroyStringList(items);
+}
+
+void ExpandTranslationCall(std::string& value) {
+    const std::string::size_type first = FindFirstNonWhitespace(value, 0);
+    if (first == std::string::npos) {
+        return;
+    }
+    const std::string::size_type last = FindLastNonWhitespace(value);
+    if (value.size() <= first + 2 || value[first] != '_' || value[first + 1] != '(' ||
+        value[last] != ')') {
+        return;
+    }
+    // The message is not trimmed: white space inside the parentheses counts.
+    const std::string message = value.substr(first + 2, last - first - 2);
+    value = _(message.c_str());
+}

@@ -1,0 +1,22 @@
+// The token syntax of string values in the parse tree text format, shared by
+// the string leaves, the reader and the writer. Internal to the library.
+#pragma once
+
+#include <string>
+
+// The token for `value`: between double quotes, with '"', line feed and
+// backslash written as \q, \n and \\. A null value gives \q\q without quotes.
+// Caller frees with free().
+char* QuoteToken(const char* value);
+
+// The value of `token`: unquoted quote marks dropped, escapes undone, then the
+// '@' translation forms and ExpandMkTokenString applied. Null gives "".
+std::string UnquoteToken(const char* token);
+
+// Rewrites MkTokenString(a,b,...) as a|b|..., dropping the items from the
+// first NULL item on; a value without the keyword gets ExpandTranslationCall.
+void ExpandMkTokenString(std::string& value);
+
+// Replaces a value of the form _(message), white space around it allowed, by
+// the translation of the message.
+void ExpandTranslationCall(std::string& value);
