@@ -425,6 +425,33 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     void WriteToFile(FILE* stream) const;
 
     // Reading from text: defined in dwxparse_reader.cpp.
+    // Reads the file that `stream` was opened on (by DKOpen) into this
+    // subtree, from its start; a stream DKOpen did not open is read from its
+    // own content, and reports then name the source "Memory". A null stream
+    // is ignored. The stream is left at its start. A corrupt line outside
+    // every subtree raises tzn::Exception; everything read before it stays.
+    void BuildFromFile(FILE* stream);
+    // The same for a text buffer; null does nothing.
+    void BuildFromString(const char* buffer);
+    // Reads from `lines` until a closing line or the end of the list.
+    // `fileName` names the source in reports (null: "Memory"). Counting starts
+    // at *lineCounter and the count is stored back (lineCounter may be null).
+    // Returns the position after the closing line, the terminator's position,
+    // or null for null lines and for a reading ended by an error inside a
+    // nested subtree. Borrowed positions in `lines`.
+    char** AddChildrenFromStringList(char** lines, const char* fileName, int* lineCounter);
+    // 1 when the line is blank or its first non-white character is '!' or
+    // '#'; null counts as empty.
+    static int IsCommentOrEmptyLine(const char* line);
+    // The index of the first line that is neither empty nor a comment; -1
+    // when there is none or lines is null.
+    static int FindPossiblePTNTreeStart(const char** lines);
+    // Builds nothing and always returns null.
+    static PTNSubTree* BuildPTNSubTreeFromStringList(const char** lines);
+    // 1 when the stream's first line that is neither empty nor a comment
+    // opens a subtree named `name` (ignoring case), else 0; the stream is
+    // left at its start. Defined in dwxparse_validate.cpp.
+    static int PTNValidateFile(FILE* stream, const char* name);
 
   private:
     void CopyChildrenFrom(const PTNSubTree& other);
