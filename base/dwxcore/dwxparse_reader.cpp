@@ -56,6 +56,67 @@ const char* SourceName(const char* fileName) {
     return fileName ? fileName : "Memory";
 }
 
+// The type keywords the reader builds nodes for, compared ignoring case; a
+// keyword that begins with "Bool" is a Bool whatever follows.
+enum class Keyword {
+    SubTree,
+    String,
+    StringList,
+    Integer,
+    Char,
+    Bool,
+    Double,
+    DoubleList,
+    Base64,
+    Other
+};
+
+// Every line passes here, so the first letter picks the few candidates
+// before any whole comparison is made.
+Keyword Classify(const char* keyword) {
+    switch (keyword[0] | 0x20) {
+        case 's':
+            if (_stricmp(keyword, "SubTree") == 0)
+                return Keyword::SubTree;
+            if (_stricmp(keyword, "String") == 0)
+                return Keyword::String;
+            if (_stricmp(keyword, "StringList") == 0)
+                return Keyword::StringList;
+            break;
+        case 'i':
+            if (_stricmp(keyword, "Integer") == 0)
+                return Keyword::Integer;
+            break;
+        case 'c':
+            if (_stricmp(keyword, "Char") == 0)
+                return Keyword::Char;
+            break;
+        case 'b':
+            if (_strnicmp(keyword, "Bool", 4) == 0)
+                return Keyword::Bool;
+            if (_stricmp(keyword, "Base64") == 0)
+                return Keyword::Base64;
+            break;
+        case 'd':
+            if (_stricmp(keyword, "Double") == 0)
+                return Keyword::Double;
+            if (_stricmp(keyword, "DoubleList") == 0)
+                return Keyword::DoubleList;
+            break;
+        default:
+            break;
+    }
+    return Keyword::Other;
+}
+
+bool IsDirective(const char* name, bool& required) {
+    if (name[0] != '@') {
+        return false;
+    }
+    required = _stricmp(name, "@include") == 0;
+    return required || _stricmp(name, "@try_include") == 0;
+}
+
 // The files being read on this thread's current include chain, by canonical
 // path, and the number of includes open on it. A file already on the chain is
 // not read again, which stops include cycles; a diamond (one file included
@@ -143,7 +204,7 @@ class TreeReader {
     // Copies a line, trims it, cuts a glued ')' and splits it in place.
     // Returns the number of tokens; oTokens holds them, null-terminated.
     size_t Split(const char* line);
-    void BuildLeaf(PTNSubTree* parent, const char* name, const char* keyword, size_t tokenCount);
+    void BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount);
     void Include(PTNSubTree* target, const char* directive, const char* file, int line,
                  const char* fileName, bool required);
 
@@ -224,11 +285,11 @@ char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, in
             }
             PTNSubTree* current = open.empty() ? root : open.back().first;
             const char* name = oTokens[0] + 1;
-            const char* keyword = oTokens[1];
-            bool include = _stricmp(name, "@include") == 0;
-            if (include || _stricmp(name, "@try_include") == 0) {
-                Include(current, name, oTokens[1], counter, fileName, include);
-            } else if (_stricmp(keyword, "SubTree") == 0) {
+            bool required = false;
+            Keyword kind = Keyword::Other;
+            if (IsDirective(name, required)) {
+                Include(current, name, oTokens[1], counter, fileName, required);
+            } else if ((kind = Classify(oTokens[1])) == Keyword::SubTree) {
                 auto subtree = std::make_unique<PTNSubTree>(name);
                 PTNSubTree* raw = subtree.get();
                 current->AddChild(subtree.release());
@@ -236,7 +297,7 @@ char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, in
             } else if (tokenCount < 3) {
                 ReportCorruptLine(fileName, counter);
             } else {
-                BuildLeaf(current, name, keyword, tokenCount);
+                BuildLeaf(current, name, kind, tokenCount);
             }
         } catch (const tzn::Exception&) {
             // Outside every subtree the exception is the caller's; inside
@@ -252,8 +313,7 @@ char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, in
     return position;
 }
 
-void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, const char* keyword,
-                           size_t tokenCount) {
+void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount) {
     // The value tokens run from the third token up to the first one that
     // begins with ')'.
     size_t valueEnd = 2;
@@ -263,47 +323,60 @@ void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, const char* key
     const char* third = oTokens[2];
     std::unique_ptr<DWXParseTreeNode> node;
 
-    if (_stricmp(keyword, "String") == 0) {
-        std::string value;
-        if (valueEnd == 3) {
-            value = UnquoteToken(third);
-        } else {
-            oJoined.clear();
-            for (size_t i = 2; i < valueEnd; ++i) {
-                oJoined.append(oTokens[i]);
+    switch (kind) {
+        case Keyword::String: {
+            std::string value;
+            if (valueEnd == 3) {
+                value = UnquoteToken(third);
+            } else {
+                oJoined.clear();
+                for (size_t i = 2; i < valueEnd; ++i) {
+                    oJoined.append(oTokens[i]);
+                }
+                value = UnquoteToken(oJoined.c_str());
             }
-            value = UnquoteToken(oJoined.c_str());
+            node = std::make_unique<PTNString>(name, value.c_str());
+            break;
         }
-        node = std::make_unique<PTNString>(name, value.c_str());
-    } else if (_stricmp(keyword, "StringList") == 0) {
-        auto list = std::make_unique<PTNStringList>(name, nullptr);
-        oTokens[valueEnd] = nullptr;  // the value tokens as a string list
-        list->SetAsStringList(&oTokens[2]);
-        node = std::move(list);
-    } else if (_stricmp(keyword, "Integer") == 0) {
-        node = std::make_unique<PTNInteger>(name, atoi(third));
-    } else if (_stricmp(keyword, "Char") == 0) {
-        node = std::make_unique<PTNChar>(name, third[0]);
-    } else if (_strnicmp(keyword, "Bool", 4) == 0) {
-        int value = _stricmp(third, "TRUE") == 0 || _stricmp(third, "YES") == 0 ||
-                    _stricmp(third, "1") == 0 || _stricmp(third, "Y") == 0;
-        node = std::make_unique<PTNBool>(name, value);
-    } else if (_stricmp(keyword, "Double") == 0) {
-        node = std::make_unique<PTNDouble>(name, atof(third));
-    } else if (_stricmp(keyword, "DoubleList") == 0) {
-        oDoubles.clear();
-        for (size_t i = 2; i < valueEnd; ++i) {
-            oDoubles.push_back(atof(oTokens[i]));
+        case Keyword::StringList: {
+            auto list = std::make_unique<PTNStringList>(name, nullptr);
+            oTokens[valueEnd] = nullptr;  // the value tokens as a string list
+            list->SetAsStringList(&oTokens[2]);
+            node = std::move(list);
+            break;
         }
-        // No value tokens give a list without values (and without an array).
-        node = std::make_unique<PTNDoubleList>(name, static_cast<int>(oDoubles.size()),
-                                               oDoubles.data());
-    } else if (_stricmp(keyword, "Base64") == 0) {
-        auto data = std::make_unique<PTNBase64>(name, nullptr, 0u);
-        data->SetAsString(third);
-        node = std::move(data);
-    } else {
-        return;  // a keyword the reader builds nothing for
+        case Keyword::Integer:
+            node = std::make_unique<PTNInteger>(name, atoi(third));
+            break;
+        case Keyword::Char:
+            node = std::make_unique<PTNChar>(name, third[0]);
+            break;
+        case Keyword::Bool: {
+            int value = _stricmp(third, "TRUE") == 0 || _stricmp(third, "YES") == 0 ||
+                        _stricmp(third, "1") == 0 || _stricmp(third, "Y") == 0;
+            node = std::make_unique<PTNBool>(name, value);
+            break;
+        }
+        case Keyword::Double:
+            node = std::make_unique<PTNDouble>(name, atof(third));
+            break;
+        case Keyword::DoubleList:
+            oDoubles.clear();
+            for (size_t i = 2; i < valueEnd; ++i) {
+                oDoubles.push_back(atof(oTokens[i]));
+            }
+            // No value tokens give a list without values (and without an array).
+            node = std::make_unique<PTNDoubleList>(name, static_cast<int>(oDoubles.size()),
+                                                   oDoubles.data());
+            break;
+        case Keyword::Base64: {
+            auto data = std::make_unique<PTNBase64>(name, nullptr, 0u);
+            data->SetAsString(third);
+            node = std::move(data);
+            break;
+        }
+        default:
+            return;  // a keyword the reader builds nothing for
     }
     parent->AddChild(node.release());
 }
