@@ -219,7 +219,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
                 const DWXString copy(s);
                 DWXString assigned("x");
                 assigned = copy;
-                s = s;
+                const DWXString& same = s;
+                s = same;
                 s = assigned;
                 break;
             }
