@@ -51,8 +51,14 @@ const char* DWXBag::GetClassName() const {
 // visited; removing the member just yielded makes the walk miss the last
 // member, which moved into the slot behind it.
 DWXObject* DWXBag::Start(DWXIter* iter) const {
+    // On an empty bag the walk stays before slot 0, so that members added
+    // afterwards are all visited, as in an array.
+    if (nCount == 0) {
+        SetPosition(iter, 0);
+        return nullptr;
+    }
     SetPosition(iter, 1);
-    return nCount > 0 ? ppoItems[0] : nullptr;
+    return ppoItems[0];
 }
 
 DWXObject* DWXBag::Next(DWXIter* iter) const {
