@@ -1,10 +1,9 @@
-// The Base64 codec and leaf: RFC 4648 vectors, every short length, all byte
-// values, the stop-at-first-invalid rule and the node's own text handling.
+// The Base64 codec and leaf: RFC 4648 vectors, every short length and byte
+// value, the stop-at-first-invalid rule, and the node's text handling.
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 
 #include <stdlib.h>
-#include <string.h>
 
 #include <memory>
 #include <string>
@@ -40,19 +39,15 @@ TEST(Base64Test, Rfc4648Vectors) {
                                 {"foob", "Zm9vYg=="},
                                 {"fooba", "Zm9vYmE="},
                                 {"foobar", "Zm9vYmFy"},
-                                {"abc", "YWJj"},
-                                {"ab", "YWI="},
-                                {"a", "YQ=="}};
+                                {"\xFB\xFF", "+/8="}};
     for (const auto& v : vectors) {
         EXPECT_EQ(Encode(v[0]), v[1]);
         EXPECT_EQ(base64_decode(v[1]), v[0]);
     }
     EXPECT_EQ(base64_encode(nullptr, 3), "");
-    EXPECT_EQ(Encode(std::string("\xFB\xFF", 2)), "+/8=");  // the last two letters of the alphabet
 }
 
-TEST(Base64Test, EveryLengthUpToEightAndEveryByteRoundTrips) {
-    // Bytes 0 and above 127 in every position of every short length.
+TEST(Base64Test, EveryLengthUpToEightAndEveryByteRoundTrip) {
     const std::string pattern("\x00\xFF\x80\x7F\x01\xFE\x00\xC3\x3F", 9);
     for (size_t length = 0; length <= 8; ++length) {
         for (size_t offset = 0; offset + length <= pattern.size(); ++offset) {
@@ -60,123 +55,75 @@ TEST(Base64Test, EveryLengthUpToEightAndEveryByteRoundTrips) {
             const std::string text = Encode(bytes);
             EXPECT_EQ(text.size(), 4 * ((length + 2) / 3));
             EXPECT_EQ(base64_decode(text), bytes);
-            // Pad characters are optional on reading.
-            EXPECT_EQ(base64_decode(text.substr(0, text.find('='))), bytes);
+            EXPECT_EQ(base64_decode(text.substr(0, text.find('='))), bytes);  // pads optional
         }
     }
     std::string all;
     for (int b = 0; b < 256; ++b) {
         all += static_cast<char>(b);
-        const std::string single(1, static_cast<char>(b));
-        ASSERT_EQ(base64_decode(Encode(single)), single) << b;
     }
     EXPECT_EQ(base64_decode(Encode(all)), all);
 }
 
 TEST(Base64Test, DecodingStopsAtTheFirstPadOrForeignByte) {
-    const struct {
-        std::string text;
-        std::string bytes;
-    } cases[] = {
-        {"Y", ""},
-        {"=YWJj", ""},
-        {"YWJj\nYWJj", "abc"},
-        {"YW Jj", "a"},
-        {"YWI", "ab"},
-        {"YWI=YWJj", "ab"},
-        {"YWJjY", "abc"},  // a final single character gives nothing
-        {"YWJjYQ", "abca"},
-        {"YWJjYWI", "abcab"},
-        {"YWJj-_", "abc"},  // the URL-safe letters are not in the alphabet
-        {"YW\xC3\xA9Jj", "a"},
-        {std::string("YWJj\0YWJj", 9), "abc"},
-        {"YWJ\x80", "ab"},
-        {"\xFF", ""},
-        {"YR==", "a"},  // surplus bits of an incomplete group are not tested
-    };
+    const std::string cases[][2] = {{"Y", ""},
+                                    {"=YWJj", ""},
+                                    {"YWJj\nYWJj", "abc"},
+                                    {"YW Jj", "a"},
+                                    {"YWI=YWJj", "ab"},
+                                    {"YWJjY", "abc"},
+                                    {"YWJjYWI", "abcab"},
+                                    {"YWJj-_", "abc"},
+                                    {"YW\xC3\xA9", "a"},
+                                    {std::string("YWJj\0YWJj", 9), "abc"},
+                                    {"YR==", "a"}};
     for (const auto& c : cases) {
-        EXPECT_EQ(base64_decode(c.text), c.bytes) << c.text;
+        EXPECT_EQ(base64_decode(c[0]), c[1]) << c[0];
     }
 }
 
-TEST(Base64Test, NodeTextAndDecode) {
-    const unsigned char bytes[] = {0, 'a', 200, 0};
-    PTNBase64 node("b", bytes, 4);
-    EXPECT_EQ(Text(node), "AGHIAA==");
-    EXPECT_EQ(Decoded(node), std::string("\0a\xC8\0", 4));
-    EXPECT_EQ(Decoded(node, "YWJj"), "abc");  // an explicit text, the node unchanged
-    EXPECT_EQ(Text(node), "AGHIAA==");
+TEST(Base64Test, NodeKeepsItsTextAndDecodesOnDemand) {
+    const unsigned char bytes[] = {0, 'a', 200};
+    PTNBase64 node("b", bytes, 3);
+    EXPECT_EQ(Text(node), "AGHI");
+    EXPECT_EQ(Decoded(node), std::string("\0a\xC8", 3));
+    EXPECT_EQ(Decoded(node, "YWJj"), "abc");
+    EXPECT_EQ(Text(node), "AGHI");
+    free(node.Decode(nullptr, nullptr));
 
-    for (PTNBase64* empty : {new PTNBase64("e", nullptr, 4), new PTNBase64("e", bytes, 0)}) {
-        EXPECT_EQ(Text(*empty), "");  // no text renders as the empty text
-        EXPECT_EQ(Decoded(*empty), "");
-        EXPECT_EQ(Decoded(*empty, ""), "");
-        std::unique_ptr<DWXParseTreeNode> copy(empty->Copy());
-        EXPECT_EQ(Text(*copy), "");
-        delete empty;
-    }
-    free(node.Decode(nullptr, nullptr));  // the count may be ignored
-}
+    PTNBase64 empty("e", bytes, 0);
+    EXPECT_EQ(Text(empty), "");
+    EXPECT_EQ(Decoded(empty), "");  // a block free() accepts, and a count of 0
+    EXPECT_EQ(Text(*std::unique_ptr<DWXParseTreeNode>(empty.Copy())), "");
+    EXPECT_EQ(Text(PTNBase64("e", nullptr, 3)), "");
 
-TEST(Base64Test, SetAsStringIsVerbatimAndCopyRecodes) {
-    PTNBase64 node("b", nullptr, 0);
-    node.SetAsString("YWI");
+    node.SetAsString("YWI");  // verbatim; Copy and SetFrom encode afresh
     EXPECT_EQ(Text(node), "YWI");
-    std::unique_ptr<DWXParseTreeNode> copy(node.Copy());
-    EXPECT_EQ(Text(*copy), "YWI=");
-    EXPECT_STREQ(copy->GetName(), "b");
-    EXPECT_EQ(copy->GetParentRef(), nullptr);
-
+    EXPECT_EQ(Text(*std::unique_ptr<DWXParseTreeNode>(node.Copy())), "YWI=");
     PTNBase64 target("t", nullptr, 0);
     target.SetFrom(&node);
     EXPECT_EQ(Text(target), "YWI=");
-    EXPECT_STREQ(target.GetName(), "t");
-
-    node.SetAsString("not base64!");
-    EXPECT_EQ(Text(node), "not base64!");
-    EXPECT_EQ(Decoded(node), base64_decode("not"));
-    node.SetAsString(nullptr);
-    EXPECT_EQ(Text(node), "");
-}
-
-TEST(Base64Test, SetFromTestsTheClassAndKeepsDataWithItself) {
-    const unsigned char bytes[] = {'a', 'b', 'c'};
-    PTNBase64 node("b", bytes, 3);
-    PTNString text("s", "YWJj");
-    node.SetFrom(&text);
-    node.SetFrom(nullptr);
-    EXPECT_EQ(Text(node), "YWJj");
-
-    node.SetFrom(&node);
-    EXPECT_EQ(Decoded(node), "abc");
-    node.SetAsString("YWI");
-    node.SetFrom(&node);
+    node.SetFrom(&node);  // with itself the data stays
     EXPECT_EQ(Decoded(node), "ab");
-
-    PTNBase64 empty("e", nullptr, 0);
-    node.SetFrom(&empty);
-    EXPECT_EQ(Text(node), "");
-    PTNBase64 invalid("i", nullptr, 0);
-    invalid.SetAsString("=");
-    PTNBase64 target("t", bytes, 3);
-    target.SetFrom(&invalid);  // 0 bytes leave no text
+    PTNString other("s", "YWJj");
+    node.SetFrom(&other);
+    node.SetFrom(nullptr);
+    EXPECT_EQ(Decoded(node), "ab");
+    target.SetFrom(&empty);
     EXPECT_EQ(Text(target), "");
 }
 
 TEST(Base64Test, CopyConstructionAndAssignmentAreDeep) {
-    const unsigned char bytes[] = {1, 2, 3, 4};
-    auto source = std::make_unique<PTNBase64>("b", bytes, 4);
-    source->SetAsString("AQIDBA");  // kept verbatim by the copy operations
+    auto source = std::make_unique<PTNBase64>("b", nullptr, 0);
+    source->SetAsString("AQIDBA");
     PTNBase64 copy(*source);
-    PTNBase64 assigned("x", bytes, 1);
+    PTNBase64 assigned("x", nullptr, 0);
     assigned = *source;
     const PTNBase64& alias = assigned;
     assigned = alias;
     source.reset();
-    EXPECT_EQ(Text(copy), "AQIDBA");
-    EXPECT_EQ(Text(assigned), "AQIDBA");
+    EXPECT_EQ(Text(copy) + Text(assigned), "AQIDBAAQIDBA");
     EXPECT_STREQ(assigned.GetName(), "b");
-    EXPECT_EQ(Decoded(copy), std::string("\1\2\3\4"));
 }
 
 }  // namespace
