@@ -1,12 +1,13 @@
 #include <dwxcore/dwxobject.h>
 
+#include "dwxcontainer_internal.h"
+
 #include "dwxquicksort.h"
 
 #include <services/rtprim.h>
 
 #include <stdlib.h>
 #include <climits>
-#include <unordered_set>
 
 namespace {
 
@@ -141,19 +142,15 @@ void DWXArray::Empty() {
 }
 
 void DWXArray::DestroyContents() {
-    // Each slot is cleared before its member is deleted, and a pointer held
-    // in several slots is deleted once.
-    std::unordered_set<DWXObject*> deleted;
-    for (int i = 0; ppoItems && i < nTop; ++i) {
-        DWXObject* member = ppoItems[i];
-        if (member) {
-            ppoItems[i] = nullptr;
-            --nCount;
-            if (deleted.insert(member).second) {
-                delete member;
-            }
-        }
-    }
+    // The slots are taken from the array before any member is deleted, so a
+    // destructor never sees a member that is already gone; a pointer held in
+    // several slots is deleted once.
+    DWXObject** items = ppoItems;
+    int top = nTop;
+    ppoItems = nullptr;
+    nCount = nCapacity = nTop = 0;
+    dwxcore_detail::DeleteEachOnce(items, items ? static_cast<size_t>(top) : 0);
+    free(items);
     Empty();
 }
 

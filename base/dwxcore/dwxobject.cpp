@@ -1,5 +1,8 @@
 #include <dwxcore/dwxobject.h>
 
+#include "dwxcontainer_internal.h"
+
+#include <algorithm>
 #include <unordered_set>
 #include <vector>
 
@@ -88,13 +91,8 @@ void DWXContainer::AddContainer(const DWXContainer* other) {
 }
 
 void DWXContainer::DestroyContents() {
-    // A pointer may be stored more than once; delete it only the first time.
-    std::unordered_set<DWXObject*> deleted;
-    for (DWXObject* member : Snapshot(this)) {
-        if (deleted.insert(member).second) {
-            delete member;
-        }
-    }
+    std::vector<DWXObject*> members = Snapshot(this);
+    dwxcore_detail::DeleteEachOnce(members.data(), members.size());
     Empty();
 }
 
@@ -163,3 +161,40 @@ void DWXIter::SetTarget(const DWXContainer* container) {
 // DWXValidatable
 
 DWXValidatable::~DWXValidatable() {}
+
+namespace dwxcore_detail {
+
+void DeleteEachOnce(DWXObject* const* members, size_t count) {
+    // Duplicates are rare (AddContainer of a container into itself), so look
+    // for them cheaply first and pay for a set only when there are some.
+    bool duplicates = false;
+    if (count <= 16) {
+        for (size_t i = 1; i < count && !duplicates; ++i) {
+            for (size_t j = 0; j < i; ++j) {
+                if (members[i] && members[j] == members[i]) {
+                    duplicates = true;
+                    break;
+                }
+            }
+        }
+    } else {
+        std::vector<DWXObject*> sorted(members, members + count);
+        sorted.erase(std::remove(sorted.begin(), sorted.end(), nullptr), sorted.end());
+        std::sort(sorted.begin(), sorted.end());
+        duplicates = std::adjacent_find(sorted.begin(), sorted.end()) != sorted.end();
+    }
+    if (!duplicates) {
+        for (size_t i = 0; i < count; ++i) {
+            delete members[i];
+        }
+        return;
+    }
+    std::unordered_set<DWXObject*> deleted;
+    for (size_t i = 0; i < count; ++i) {
+        if (members[i] && deleted.insert(members[i]).second) {
+            delete members[i];
+        }
+    }
+}
+
+}  // namespace dwxcore_detail

@@ -1,0 +1,191 @@
+#include "json.h"
+
+#include "treefile.h"
+
+#include <dwxcore/dwxobject.h>
+#include <services/utilhub.h>
+
+#include <math.h>
+#include <stdlib.h>
+
+namespace dwxtree {
+
+namespace {
+
+void AppendEscape(std::string& out, unsigned code) {
+    char text[8];
+    snprintf(text, sizeof text, "\\u%04x", code);
+    out += text;
+}
+
+// The length of the valid UTF-8 sequence at `p` (at most `left` bytes) and
+// its code point; 0 when the bytes there are no valid sequence (overlong
+// forms, surrogates and values above U+10FFFF included).
+size_t DecodeUtf8(const unsigned char* p, size_t left, unsigned& code) {
+    unsigned char lead = p[0];
+    size_t length;
+    unsigned minimum;
+    if (lead >= 0xC2 && lead <= 0xDF) {
+        length = 2, minimum = 0x80, code = lead & 0x1Fu;
+    } else if (lead >= 0xE0 && lead <= 0xEF) {
+        length = 3, minimum = 0x800, code = lead & 0x0Fu;
+    } else if (lead >= 0xF0 && lead <= 0xF4) {
+        length = 4, minimum = 0x10000, code = lead & 0x07u;
+    } else {
+        return 0;
+    }
+    if (left < length) {
+        return 0;
+    }
+    for (size_t i = 1; i < length; ++i) {
+        if ((p[i] & 0xC0) != 0x80) {
+            return 0;
+        }
+        code = (code << 6) | (p[i] & 0x3Fu);
+    }
+    if (code < minimum || code > 0x10FFFF || (code >= 0xD800 && code <= 0xDFFF)) {
+        return 0;
+    }
+    return length;
+}
+
+std::string Quoted(const char* text) {
+    return text ? "\"" + JsonEscape(text) + "\"" : std::string("null");
+}
+
+void Indent(FILE* stream, int level) {
+    fprintf(stream, "%*s", 2 * level, "");
+}
+
+template <class T, class Format>
+void WriteArray(FILE* stream, const T* values, int count, Format format) {
+    fputc('[', stream);
+    for (int i = 0; i < count; ++i) {
+        fprintf(stream, "%s%s", i ? ", " : "", format(values[i]).c_str());
+    }
+    fputc(']', stream);
+}
+
+void WriteValue(FILE* stream, DWXParseTreeNode* node, int level);
+
+void WriteObject(FILE* stream, const PTNSubTree& tree, int level) {
+    if (tree.GetChildren()->IsEmpty()) {
+        fputs("{}", stream);
+        return;
+    }
+    fputs("{\n", stream);
+    DWXIter iter(tree.GetChildren());
+    bool first = true;
+    for (DWXObject* object = iter.Start(); object; object = iter.Next()) {
+        auto* node = static_cast<DWXParseTreeNode*>(object);
+        fputs(first ? "" : ",\n", stream);
+        first = false;
+        Indent(stream, level + 1);
+        fprintf(stream, "%s: ", Quoted(node->GetName()).c_str());
+        WriteValue(stream, node, level + 1);
+    }
+    fputc('\n', stream);
+    Indent(stream, level);
+    fputc('}', stream);
+}
+
+std::string IntText(int value) {
+    return std::to_string(value);
+}
+
+void WriteValue(FILE* stream, DWXParseTreeNode* node, int level) {
+    int count = 0;
+    if (auto* subtree = dynamic_cast<PTNSubTree*>(node)) {
+        WriteObject(stream, *subtree, level);
+    } else if (auto* flag = dynamic_cast<PTNBool*>(node)) {
+        fputs(flag->GetValue() ? "true" : "false", stream);
+    } else if (auto* integer = dynamic_cast<PTNInteger*>(node)) {
+        fputs(IntText(integer->GetValue()).c_str(), stream);
+    } else if (auto* single = dynamic_cast<PTNFloat*>(node)) {
+        fputs(JsonNumber(single->GetValue()).c_str(), stream);
+    } else if (auto* number = dynamic_cast<PTNDouble*>(node)) {
+        fputs(JsonNumber(number->GetValue()).c_str(), stream);
+    } else if (auto* character = dynamic_cast<PTNChar*>(node)) {
+        char text[2] = {character->GetValue(), '\0'};
+        fputs(Quoted(text).c_str(), stream);
+    } else if (auto* string = dynamic_cast<PTNString*>(node)) {
+        fputs(Quoted(string->GetValue()).c_str(), stream);
+    } else if (auto* strings = dynamic_cast<PTNStringList*>(node)) {
+        char** list = strings->GetValue();
+        WriteArray(stream, list, CountStringList(list), Quoted);
+    } else if (auto* integers = dynamic_cast<PTNIntegerList*>(node)) {
+        int* values = integers->GetValue(&count);
+        WriteArray(stream, values, count, IntText);
+    } else if (auto* integers32 = dynamic_cast<PTNInteger32List*>(node)) {
+        int* values = integers32->GetValue(&count);
+        WriteArray(stream, values, count, IntText);
+    } else if (auto* doubles = dynamic_cast<PTNDoubleList*>(node)) {
+        double* values = doubles->GetValue(&count);
+        WriteArray(stream, values, count, JsonNumber);
+    } else {
+        // Base64 and any other leaf: the text the leaf renders.
+        char* text = node->GetAsString();
+        fputs(Quoted(text ? text : "").c_str(), stream);
+        free(text);
+    }
+}
+
+}  // namespace
+
+std::string JsonEscape(const std::string& bytes) {
+    std::string out;
+    const auto* p = reinterpret_cast<const unsigned char*>(bytes.data());
+    size_t left = bytes.size();
+    while (left > 0) {
+        unsigned char c = *p;
+        size_t used = 1;
+        unsigned code = 0;
+        if (c == '"' || c == '\\') {
+            out += '\\';
+            out += static_cast<char>(c);
+        } else if (c == '\n') {
+            out += "\\n";
+        } else if (c == '\t') {
+            out += "\\t";
+        } else if (c == '\r') {
+            out += "\\r";
+        } else if (c < 0x20 || c == 0x7F) {
+            AppendEscape(out, c);
+        } else if (c < 0x80) {
+            out += static_cast<char>(c);
+        } else if ((used = DecodeUtf8(p, left, code)) == 0) {
+            used = 1;
+            AppendEscape(out, c);
+        } else if (code > 0xFFFF) {
+            code -= 0x10000;
+            AppendEscape(out, 0xD800 + (code >> 10));
+            AppendEscape(out, 0xDC00 + (code & 0x3FF));
+        } else {
+            AppendEscape(out, code);
+        }
+        p += used;
+        left -= used;
+    }
+    return out;
+}
+
+std::string JsonNumber(double value) {
+    if (!isfinite(value)) {
+        return "null";
+    }
+    char text[40];
+    for (int digits = 1; digits <= 17; ++digits) {
+        snprintf(text, sizeof text, "%.*g", digits, value);
+        if (strtod(text, nullptr) == value) {
+            break;
+        }
+    }
+    return text;
+}
+
+void WriteJson(FILE* stream, const PTNSubTree& root) {
+    WriteObject(stream, root, 0);
+    fputc('\n', stream);
+}
+
+}  // namespace dwxtree
