@@ -31,6 +31,12 @@ namespace {
 // Nested includes allowed below the file the reading started from.
 constexpr int kMaxIncludeDepth = 64;
 
+// Subtrees may nest this deep, counted from the outermost subtree of the tree
+// being read into. Reading itself needs no stack for nesting, but writing,
+// copying, merging and deleting a tree recurse once per level; the limit
+// keeps every tree the reader builds within their reach.
+constexpr int kMaxNesting = 1000;
+
 struct StringListDeleter {
     void operator()(char** list) const { DestroyStringList(list); }
 };
@@ -175,6 +181,25 @@ class ChainEntry {
     throw tzn::Exception(-1, 1, message.c_str());
 }
 
+// Reports a subtree nested deeper than kMaxNesting, like a corrupt line.
+[[noreturn]] void ReportNestingTooDeep(const char* fileName, int line) {
+    const char* text = MkName(_("Corrupt file %s\n at line %d ... subtrees nested more than %d "
+                                "levels deep.\n"),
+                              SourceName(fileName), line, kMaxNesting);
+    std::string message(text);
+    IMPError(-1, 1, message.c_str());
+    throw tzn::Exception(-1, 1, message.c_str());
+}
+
+// The number of subtrees from the outermost one down to `tree`, both included.
+int Level(const PTNSubTree* tree) {
+    int level = 0;
+    for (; tree; tree = tree->GetParentRef()) {
+        ++level;
+    }
+    return level;
+}
+
 // The whole content of a stream from its start, as lines; the stream is left
 // at its start.
 char** ReadStreamLines(FILE* stream) {
@@ -263,6 +288,7 @@ char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, in
     // opening line: an error inside one ends the reading with that count, as
     // the level that holds it would have kept.
     std::vector<std::pair<PTNSubTree*, int>> open;
+    const int rootLevel = Level(root);
     int counter = count;
     char** position = lines;
     while (*position) {
@@ -290,6 +316,9 @@ char** TreeReader::Read(PTNSubTree* root, char** lines, const char* fileName, in
             if (IsDirective(name, required)) {
                 Include(current, name, oTokens[1], counter, fileName, required);
             } else if ((kind = Classify(oTokens[1])) == Keyword::SubTree) {
+                if (rootLevel + static_cast<int>(open.size()) >= kMaxNesting) {
+                    ReportNestingTooDeep(fileName, counter);
+                }
                 auto subtree = std::make_unique<PTNSubTree>(name);
                 PTNSubTree* raw = subtree.get();
                 current->AddChild(subtree.release());
