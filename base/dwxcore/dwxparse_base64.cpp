@@ -8,7 +8,7 @@
 
 namespace {
 
-const char kAlphabet[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+constexpr char kAlphabet[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
 const unsigned char kInvalid = 0x80;  // marks every byte outside the alphabet, '=' included
 
 // The value of every byte: its index in the alphabet, or kInvalid.
