@@ -275,7 +275,9 @@ TEST_F(RobustnessTest, MegabyteLine) {
 }
 
 TEST_F(RobustnessTest, AMillionSiblings) {
-    const int count = 1000000;
+    // Memcheck runs this a few hundred times slower; the valgrind tests set
+    // DWXCORE_UNDER_VALGRIND and check memory on a twentieth of the count.
+    const int count = getenv("DWXCORE_UNDER_VALGRIND") ? 50000 : 1000000;
     std::string text = "(big SubTree\n";
     text.reserve(24u * count);
     for (int i = 0; i < count; ++i) {
@@ -290,7 +292,8 @@ TEST_F(RobustnessTest, AMillionSiblings) {
     ASSERT_NE(big, nullptr);
     ASSERT_EQ(big->GetChildren()->GetCount(), count);
     EXPECT_EQ(big->GetChildAsInteger("i0"), 0);
-    EXPECT_EQ(big->GetChildAsInteger("i999999"), 999999);
+    const std::string last = "i" + std::to_string(count - 1);
+    EXPECT_EQ(big->GetChildAsInteger(last.c_str()), count - 1);
     EXPECT_EQ(tree.GetChildAsInteger("after"), 1);
 
     char** lines = big->GetAsStringList(0);
