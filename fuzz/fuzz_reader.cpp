@@ -117,16 +117,21 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     delete copy;
 
     if (!found.expands) {
-        PTNSubTree reread("reread");
+        // The lines between the opening and the closing line of the root are
+        // its children: read them into a new root, so that the new tree nests
+        // exactly as deep as the first one.
+        const std::string lines(written);
+        const size_t bodyStart = lines.find('\n') + 1;
+        const size_t bodyEnd = lines.rfind('\n', lines.size() - 2) + 1;
+        FUZZ_CHECK(lines.compare(0, bodyStart, "(root SubTree\n") == 0);
+        FUZZ_CHECK(lines.compare(bodyEnd, std::string::npos, ")\n") == 0);
+        PTNSubTree reread("root");
         try {
-            reread.BuildFromString(written);
+            reread.BuildFromString(lines.substr(bodyStart, bodyEnd - bodyStart).c_str());
         } catch (const tzn::Exception&) {
             FUZZ_CHECK(!"written text read back as corrupt");
         }
-        FUZZ_CHECK(reread.GetChildren()->GetCount() == 1);
-        auto* root = dynamic_cast<PTNSubTree*>((*reread.GetChildren())[0]);
-        FUZZ_CHECK(root != nullptr && strcmp(root->GetName(), "root") == 0);
-        char* rewritten = root->GetAsString();
+        char* rewritten = reread.GetAsString();
         if (strcmp(written, rewritten) != 0) {
             fprintf(stderr, "first:\n%s\nsecond:\n%s\n", written, rewritten);
             FUZZ_CHECK(!"written, read and written again differs");

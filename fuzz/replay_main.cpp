@@ -36,12 +36,16 @@ bool RunFile(const std::filesystem::path& path) {
 }  // namespace
 
 int main(int argc, char** argv) {
+    // Absolute paths first: a target's initialisation may change directory.
+    std::vector<std::filesystem::path> arguments;
+    for (int i = 1; i < argc; ++i) {
+        arguments.push_back(std::filesystem::absolute(argv[i]));
+    }
     if (LLVMFuzzerInitialize) {
         LLVMFuzzerInitialize(&argc, &argv);
     }
     std::vector<std::filesystem::path> files;
-    for (int i = 1; i < argc; ++i) {
-        std::filesystem::path path(argv[i]);
+    for (const auto& path : arguments) {
         if (std::filesystem::is_directory(path)) {
             for (const auto& entry : std::filesystem::recursive_directory_iterator(path)) {
                 if (entry.is_regular_file()) {
