@@ -97,16 +97,8 @@ int DWXLinkedList::Remove(const DWXObject* object) {
 }
 
 void DWXLinkedList::Empty() {
-    // The ring is closed around the sentinel first; the nodes cut off from it
-    // are then deleted in one pass without unlinking each.
-    DWXListNode* node = poHead->poNext;
-    poHead->poNext = poHead;
-    poHead->poPrev = poHead;
-    nCount = 0;
-    while (node != poHead) {
-        DWXListNode* next = node->poNext;
-        delete node;
-        node = next;
+    while (nCount != 0) {
+        Remove(poHead->poNext);
     }
 }
 
