@@ -75,26 +75,28 @@ const char* DWXArray::GetClassName() const {
 
 // The walk keeps the index of the next slot to examine, so the array may
 // change under it: members added at or above that slot are still visited.
+// The position is the iterator's nPosition, read and written directly.
 DWXObject* DWXArray::Start(DWXIter* iter) const {
     for (int i = 0; i < nTop; ++i) {
         if (ppoItems[i]) {
-            SetPosition(iter, i + 1);
+            iter->nPosition = i + 1;
             return ppoItems[i];
         }
     }
-    SetPosition(iter, 0);
+    iter->nPosition = 0;
     return nullptr;
 }
 
 DWXObject* DWXArray::Next(DWXIter* iter) const {
-    int64_t position = GetPosition(iter);
+    int64_t position = iter->nPosition;
     if (position < 0) {
         return nullptr;
     }
-    for (int64_t i = position; i < nTop; ++i) {
-        if (ppoItems[i]) {
-            SetPosition(iter, i + 1);
-            return ppoItems[i];
+    DWXObject* const* items = ppoItems;
+    for (int64_t i = position, top = nTop; i < top; ++i) {
+        if (DWXObject* member = items[i]) {
+            iter->nPosition = i + 1;
+            return member;
         }
     }
     return nullptr;
@@ -104,7 +106,7 @@ int DWXArray::IsMember(const DWXObject* object) {
     return GetIndex(object) >= 0 ? 1 : 0;
 }
 
-void DWXArray::Add(DWXObject* object) {
+void DWXArray::AddSlowly(DWXObject* object) {
     if (!object) {
         return;
     }

@@ -43,6 +43,12 @@ int SaturateToInt(int64_t value) {
     return static_cast<int>(std::clamp<int64_t>(value, INT_MIN, INT_MAX));
 }
 
+// Remainders truncate towards zero; divisibility tests are the same either
+// way. The library's own callers use this inline test; LeapYear exports it.
+inline bool IsLeapYear(int year) {
+    return year % 4 == 0 && (year % 100 != 0 || year % 400 == 0);
+}
+
 int64_t FloorDiv(int64_t a, int64_t b) {
     int64_t q = a / b;
     return (a % b != 0 && a < 0) ? q - 1 : q;
@@ -51,11 +57,22 @@ int64_t FloorDiv(int64_t a, int64_t b) {
 // Day numbers count days from 1 January of year 1 (day 0). The month must be
 // 1 to 12; any year works (years below 1 give negative numbers), and a day
 // outside the month counts on from the month's first day.
+//
+// The year is counted from March, so that the leap day ends it: January and
+// February belong to the year before, and the days before a month are
+// (153 * m + 2) / 5 for m = 0 (March) to 11 (February), with no leap test.
+// The year is moved up by whole 400-year cycles before dividing, so that the
+// divisions are by non-negative numbers and round down; the cycles' leap days
+// are taken off again.
 int64_t DayNumber(int month, int day, int year) {
-    int64_t y = int64_t(year) - 1;
-    int64_t beforeYear = 365 * y + FloorDiv(y, 4) - FloorDiv(y, 100) + FloorDiv(y, 400);
-    int leapDay = (month > 2 && DWXDate::LeapYear(year)) ? 1 : 0;
-    return beforeYear + kDaysBeforeMonth[month] + leapDay + day - 1;
+    const int64_t kCycles = int64_t(1) << 23;  // 400 * kCycles years cover every int year
+    int64_t y = int64_t(year) - (month <= 2 ? 1 : 0);
+    int64_t m = month > 2 ? month - 3 : month + 9;
+    uint64_t shifted = static_cast<uint64_t>(y + 400 * kCycles);
+    int64_t leapDays =
+        static_cast<int64_t>(shifted / 4 - shifted / 100 + shifted / 400) - 97 * kCycles;
+    // 1 January of year 1 is day 306 after 1 March of year 0.
+    return 365 * y + leapDays + (153 * m + 2) / 5 + day - 1 - 306;
 }
 
 // The inverse of DayNumber for a valid date. The caller keeps `number` within
@@ -88,15 +105,6 @@ DWXDate::DWXDate() : nMonth(1), nDay(1), nYear(1) {}
 DWXDate::DWXDate(int month, int day, int year) : nMonth(month), nDay(day), nYear(year) {
     SetDate(month, day, year);
 }
-
-DWXDate& DWXDate::operator=(const DWXDate& other) {
-    nMonth = other.nMonth;
-    nDay = other.nDay;
-    nYear = other.nYear;
-    return *this;
-}
-
-DWXDate::~DWXDate() {}
 
 // The day is checked last because its range depends on the new month and year.
 void DWXDate::SetDate(int month, int day, int year) {
@@ -171,20 +179,19 @@ int DWXDate::GetDayOfYear() const {
     if (!IsMonth(nMonth)) {
         return 0;
     }
-    int leapDay = (nMonth > 2 && LeapYear(nYear)) ? 1 : 0;
+    int leapDay = (nMonth > 2 && IsLeapYear(nYear)) ? 1 : 0;
     return SaturateToInt(int64_t(nDay) + kDaysBeforeMonth[nMonth] + leapDay);
 }
 
-// Remainders truncate towards zero; divisibility tests are the same either way.
 int DWXDate::LeapYear(int year) {
-    return (year % 4 == 0 && (year % 100 != 0 || year % 400 == 0)) ? 1 : 0;
+    return IsLeapYear(year) ? 1 : 0;
 }
 
 int DWXDate::GetDaysInMonth(int month, int year) {
     if (month < 0 || month > 12) {
         return 0;
     }
-    if (month == 2 && LeapYear(year)) {
+    if (month == 2 && IsLeapYear(year)) {
         return 29;
     }
     return kDaysPerMonth[month];

@@ -17,8 +17,8 @@ class DWXCORE_API DWXDate {
     // numbers passed here.
     DWXDate(int month, int day, int year);
     DWXDate(const DWXDate& other) = default;
-    DWXDate& operator=(const DWXDate& other);
-    ~DWXDate();
+    DWXDate& operator=(const DWXDate& other) = default;
+    ~DWXDate() = default;
 
     int GetMonth() const { return nMonth; }
     int GetDay() const { return nDay; }

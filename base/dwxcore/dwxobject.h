@@ -94,6 +94,9 @@ class DWXCORE_API DWXContainer : public DWXObject {
 // dropped at any point; a copy goes on from the same place independently.
 class DWXCORE_API DWXIter : public DWXObject {
     friend class DWXContainer;
+    // The array walk reads and writes the position directly; it is the
+    // library's hottest walk.
+    friend class DWXArray;
 
   public:
     DWXIter();
@@ -163,7 +166,18 @@ class DWXCORE_API DWXArray : public DWXContainer {
     // A null pointer is never a member.
     int IsMember(const DWXObject* object) override;
     // Appends after the highest occupied slot; a null pointer is ignored.
-    void Add(DWXObject* object) override;
+    // Inline for the usual case of room above an occupied top slot (or an
+    // empty buffer with room); every other case takes AddSlowly.
+    void Add(DWXObject* object) override {
+        int top = nTop;
+        if (object && top < nCapacity && (top == 0 || ppoItems[top - 1])) {
+            ppoItems[top] = object;
+            nTop = top + 1;
+            ++nCount;
+        } else {
+            AddSlowly(object);
+        }
+    }
     // Clears the first slot holding the pointer; frees the buffer when the
     // last member goes. 0 for a null pointer or a non-member.
     int Remove(const DWXObject* object) override;
@@ -207,6 +221,11 @@ class DWXCORE_API DWXArray : public DWXContainer {
     // One past the highest slot written; may cover trailing empty slots.
     mutable int nTop;
     DWXObject** ppoItems;
+
+  private:
+    // The rest of Add: a null pointer, a full buffer, or trailing empty
+    // slots to reuse.
+    void AddSlowly(DWXObject* object);
 };
 
 // A DWXArray whose Remove leaves no hole: the last member moves into the

@@ -95,6 +95,10 @@ void DWXString::Append(const char* text, int n) {
     free(old);
 }
 
+void DWXString::AppendChar(char ch) {
+    Append(&ch, 1);
+}
+
 void DWXString::Add(const char* a, int na, const char* b, int nb) {
     // Used on fresh results only, so neither piece lies in this buffer.
     int total = na + nb;
@@ -182,11 +186,6 @@ const DWXString& DWXString::operator+=(const DWXString& other) {
 
 const DWXString& DWXString::operator+=(const char* text) {
     Append(text, TextLength(text));
-    return *this;
-}
-
-const DWXString& DWXString::operator+=(char ch) {
-    Append(&ch, 1);
     return *this;
 }
 

@@ -46,7 +46,22 @@ class DWXCORE_API DWXString {
     // Appending; a string may be appended to itself or to a part of itself.
     const DWXString& operator+=(const DWXString& other);
     const DWXString& operator+=(const char* text);
-    const DWXString& operator+=(char ch);
+    // Inline for the common case of a block with room for the character and
+    // its NUL; otherwise the block grows as for any other append. The length
+    // is stored last, after the character stores that might alias it, so the
+    // compiler can keep it in a register across a loop of appends.
+    const DWXString& operator+=(char ch) {
+        int length = nLength;
+        char* data = pchData;
+        if (length + 1 < nCapacity) {
+            data[length] = ch;
+            data[length + 1] = '\0';
+            nLength = length + 1;
+        } else {
+            AppendChar(ch);
+        }
+        return *this;
+    }
 
     friend DWXCORE_API DWXString operator+(const DWXString& a, const DWXString& b);
     friend DWXCORE_API DWXString operator+(const DWXString& a, char b);
@@ -113,6 +128,9 @@ class DWXCORE_API DWXString {
     void Alloc(int n);
     void Assign(const char* text, int n);
     void Append(const char* text, int n);
+    // The growing path of += ch; out of line, and `ch` by value so that the
+    // inline part keeps it in a register.
+    void AppendChar(char ch);
     void Add(const char* a, int na, const char* b, int nb);
     void Ensure(int n, int keep);
     // Takes a new block when n characters do not fit. Returns the old block,
