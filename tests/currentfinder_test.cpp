@@ -65,7 +65,7 @@ class Registry : public ::testing::Test {
 // Runs `child` in a forked process that then exits normally; the number of
 // PipeObjects deleted there, or -1 when it did not exit cleanly.
 int DeletionsInExitingChild(void (*child)(int fd)) {
-    int fds[2];
+    int fds[2], count = 0, status = 0;
     if (pipe(fds) != 0) {
         return -1;
     }
@@ -76,7 +76,6 @@ int DeletionsInExitingChild(void (*child)(int fd)) {
         exit(0);
     }
     close(fds[1]);
-    int count = 0, status = 0;
     for (char byte; read(fds[0], &byte, 1) == 1;) {
         ++count;
     }
@@ -111,6 +110,8 @@ TEST_F(Registry, OneInstanceWithItsExitHook) {
     EXPECT_EQ(1, CountingObject::destroyed);
 }
 
+// Replaced objects are deleted at once, released ones belong to the caller,
+// and one object under two names is deleted once.
 TEST_F(Registry, SetGetReleaseOwnership) {
     DWXCurrentFinder* registry = GetDWXCurrentFinder();
     CountingObject* first = new CountingObject(1);
@@ -119,41 +120,28 @@ TEST_F(Registry, SetGetReleaseOwnership) {
     EXPECT_EQ(first, registry->GetCurrent("VIEW"));
     EXPECT_EQ(nullptr, registry->GetCurrent("Views"));
     EXPECT_EQ(0, CountingObject::destroyed);
-    registry->SetCurrent("view", new CountingObject(2));  // replaces and deletes the first
+    registry->SetCurrent("view", new CountingObject(2));
     EXPECT_EQ(1, CountingObject::destroyed);
     registry->SetCurrent("view", nullptr);
     EXPECT_EQ(2, CountingObject::destroyed);
 
-    // A null name is the empty name; a released object belongs to the caller.
-    CountingObject* kept = new CountingObject(3);
+    CountingObject* kept = new CountingObject(3);  // a null name is the empty name
     registry->SetCurrent(nullptr, kept);
     EXPECT_EQ(kept, registry->GetCurrent(""));
     EXPECT_EQ(kept, registry->ReleaseCurrent(""));
     EXPECT_EQ(nullptr, registry->ReleaseCurrent(""));
-    ExitProcessing::Run();
+    CountingObject* shared = new CountingObject(4);
+    registry->SetCurrent("a", shared);
+    registry->SetCurrent("b", shared);
+    registry->SetCurrent("a", new CountingObject(5));
+    registry->SetCurrent("c", kept);
+    registry->SetCurrent("d", kept);
+    EXPECT_EQ(kept, registry->ReleaseCurrent("c"));  // leaves the table under every name
+    EXPECT_EQ(nullptr, registry->GetCurrent("d"));
     EXPECT_EQ(2, CountingObject::destroyed);
+    ExitProcessing::Run();
+    EXPECT_EQ(4, CountingObject::destroyed);
     delete kept;
-}
-
-// One object under two names is deleted once, and released under one name it
-// leaves the table entirely.
-TEST_F(Registry, SharedObjectIsOwnedOnce) {
-    CountingObject* shared = new CountingObject(1);
-    GetDWXCurrentFinder()->SetCurrent("a", shared);
-    GetDWXCurrentFinder()->SetCurrent("b", shared);
-    GetDWXCurrentFinder()->SetCurrent("a", new CountingObject(2));
-    EXPECT_EQ(0, CountingObject::destroyed);
-    ExitProcessing::Run();
-    EXPECT_EQ(2, CountingObject::destroyed);
-
-    shared = new CountingObject(3);
-    GetDWXCurrentFinder()->SetCurrent("a", shared);
-    GetDWXCurrentFinder()->SetCurrent("b", shared);
-    EXPECT_EQ(shared, GetDWXCurrentFinder()->ReleaseCurrent("a"));
-    EXPECT_EQ(nullptr, GetDWXCurrentFinder()->GetCurrent("b"));
-    ExitProcessing::Run();
-    EXPECT_EQ(2, CountingObject::destroyed);
-    delete shared;
 }
 
 TEST_F(Registry, ExitDeletesInNameOrderAndStartsAfresh) {

@@ -59,49 +59,33 @@ TEST(HotPaths, ArrayAddsAgreeWithASlotModel) {
     std::vector<DWXObject*> slots;
     for (int step = 0; step < 2000; ++step) {
         DWXObject* item = random() % 5 ? &items[random() % items.size()] : nullptr;
-        int index = static_cast<int>(random() % (slots.size() + 4));  // mostly near the top
-        switch (random() % 6) {
-            case 0:
-            case 1:
-            case 2:
-                array.Add(item);
-                if (item) {
-                    while (!slots.empty() && !slots.back()) {
-                        slots.pop_back();
-                    }
-                    slots.push_back(item);
-                }
-                break;
-            case 3:
-                if (array.Remove(item)) {
-                    for (DWXObject*& slot : slots) {
-                        if (slot == item) {
-                            slot = nullptr;
-                            break;
-                        }
-                    }
-                }
-                break;
-            case 4:
-                array.SetAt(index, item);
-                slots.resize(std::max<size_t>(slots.size(), index + 1u));
-                slots[index] = item;
-                break;
-            default:
-                array.InsertAt(index, item);
-                slots.resize(std::max<size_t>(slots.size(), static_cast<size_t>(index)));
-                slots.insert(slots.begin() + index, item);
-                break;
+        size_t index = random() % (slots.size() + 4);  // mostly near the top
+        unsigned operation = random() % 6;
+        if (operation < 3) {
+            array.Add(item);
+            while (item && !slots.empty() && !slots.back())
+                slots.pop_back();  // Add reuses trailing empty slots
+            if (item)
+                slots.push_back(item);
+        } else if (operation == 3) {
+            if (array.Remove(item)) {
+                *std::find(slots.begin(), slots.end(), item) = nullptr;
+            }
+        } else if (operation == 4) {
+            array.SetAt(static_cast<int>(index), item);
+            slots.resize(std::max(slots.size(), index + 1));
+            slots[index] = item;
+        } else {
+            array.InsertAt(static_cast<int>(index), item);
+            slots.resize(std::max(slots.size(), index));
+            slots.insert(slots.begin() + static_cast<long>(index), item);
         }
         std::vector<DWXObject*> members;
-        for (int i = 0; i < static_cast<int>(slots.size()) + 2; ++i) {
-            ASSERT_EQ(array[i], i < static_cast<int>(slots.size()) ? slots[i] : nullptr)
-                << "slot " << i << " at step " << step;
-        }
-        for (DWXObject* slot : slots) {
-            if (slot) {
+        for (size_t i = 0; i < slots.size() + 2; ++i) {
+            DWXObject* slot = i < slots.size() ? slots[i] : nullptr;
+            ASSERT_EQ(array[static_cast<int>(i)], slot) << "slot " << i << " at step " << step;
+            if (slot)
                 members.push_back(slot);
-            }
         }
         ASSERT_EQ(Walk(array), members) << "step " << step;
         ASSERT_EQ(array.GetCount(), static_cast<int>(members.size()));

@@ -1,6 +1,5 @@
 // PTNValidateFile: does a stream hold a tree of a given name?
 #include <dwxcore/dwxparse.h>
-#include <services/utilhub.h>
 
 #include <gtest/gtest.h>
 
@@ -56,25 +55,17 @@ TEST(ValidateTest, Answers) {
 }
 
 TEST(ValidateTest, WrittenTreeValidatesAndReadsOnFromTheStart) {
-    char path[] = "/tmp/validate_testXXXXXX";
-    int fd = mkstemp(path);
-    ASSERT_GE(fd, 0);
-    FILE* out = fdopen(fd, "w");
+    FILE* stream = tmpfile();
     PTNSubTree config("config");
     config.AddChild(new PTNInteger("width", 640));
-    config.WriteToFile(out);
-    fclose(out);
-
-    FILE* stream = DKOpen(path, 4, "r");
-    ASSERT_NE(stream, nullptr);
+    config.WriteToFile(stream);
     EXPECT_EQ(PTNSubTree::PTNValidateFile(stream, "Config"), 1);
     PTNSubTree root("root");
     root.BuildFromFile(stream);
+    fclose(stream);
     auto* back = dynamic_cast<PTNSubTree*>(root.GetChild("config"));
     ASSERT_NE(back, nullptr);
     EXPECT_EQ(back->GetChildAsInteger("width"), 640);
-    DKClose(stream);
-    remove(path);
 }
 
 }  // namespace
