@@ -1,3 +1,5 @@
+#include "container_test_util.h"
+
 #include <dwxcore/dwxcolor.h>
 
 #include <gtest/gtest.h>
@@ -6,6 +8,7 @@
 #include <stdio.h>
 #include <stdlib.h>
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -57,30 +60,20 @@ TEST(ColorTest, BytesAlphaEqualityAndDump) {
     EXPECT_EQ(Argb(copy), "254 7 8 9");
     EXPECT_EQ(assigned, color);
 
-    char* buffer = nullptr;
-    size_t size = 0;
-    FILE* stream = open_memstream(&buffer, &size);
-    color.Dump(stream);
-    fclose(stream);
-    EXPECT_STREQ(buffer, "<DWXColor:7,8,9>\n");
-    free(buffer);
+    EXPECT_EQ(Captured([&](FILE* f) { color.Dump(f); }), "<DWXColor:7,8,9>\n");
     EXPECT_STREQ(color.GetClassName(), "DWXColor");
 }
 
 TEST(ColorTest, TableNamesInEitherSpellingAndAnyCase) {
     for (const auto& row : kTable) {
         std::string upper = row.builtin, lower = row.display;
-        for (char& c : upper)
-            c = static_cast<char>(toupper(c));
-        for (char& c : lower)
-            c = static_cast<char>(tolower(c));
-        const std::string expected = "255 " + std::to_string(row.red) + " " +
-                                     std::to_string(row.green) + " " + std::to_string(row.blue);
+        std::transform(upper.begin(), upper.end(), upper.begin(), ::toupper);
+        std::transform(lower.begin(), lower.end(), lower.begin(), ::tolower);
         for (const std::string& name :
              {std::string(row.builtin), std::string(row.display), upper, lower}) {
             DWXColor color;
             EXPECT_TRUE(color.SetByName(name.c_str())) << name;
-            EXPECT_EQ(Argb(color), expected) << name;
+            EXPECT_EQ(color, DWXColor(row.red, row.green, row.blue)) << name;
         }
     }
     // GetName gives the first display name with those components, alpha ignored.

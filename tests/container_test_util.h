@@ -1,5 +1,5 @@
-// Helpers shared by the container tests: dumps captured the way a host reads
-// them, and views of the protected bookkeeping of the containers.
+// Helpers shared by the tests: dumps and written text captured the way a host
+// reads them, and views of the protected bookkeeping of the containers.
 #pragma once
 
 #include <dwxcore/dwxobject.h>
@@ -7,16 +7,19 @@
 #include <stdio.h>
 #include <stdlib.h>
 
+#include <initializer_list>
 #include <string>
 #include <vector>
 
-// What `dump` writes to a stream, read back through open_memstream.
+using Members = std::vector<DWXObject*>;
+
+// What `write` writes to a stream, read back through open_memstream.
 template <typename Writer>
-std::string Captured(Writer dump) {
+std::string Captured(Writer write) {
     char* buffer = nullptr;
     size_t length = 0;
     FILE* stream = open_memstream(&buffer, &length);
-    dump(stream);
+    write(stream);
     fclose(stream);
     std::string text(buffer, length);
     free(buffer);
@@ -30,9 +33,15 @@ inline std::string ObjectLine(const DWXObject* object) {
     return line;
 }
 
+inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> members) {
+    for (DWXObject* member : members) {
+        container.Add(member);
+    }
+}
+
 // The members a DWXIter walk yields, in order.
-inline std::vector<DWXObject*> Walk(const DWXContainer& container) {
-    std::vector<DWXObject*> members;
+inline Members Walk(const DWXContainer& container) {
+    Members members;
     DWXIter iter;
     for (DWXObject* member = iter.Start(&container); member; member = iter.Next()) {
         members.push_back(member);
@@ -49,6 +58,13 @@ class SlotView : public Array {
     int Capacity() const { return this->nCapacity; }
     int Top() const { return this->nTop; }
     bool HasBuffer() const { return this->ppoItems != nullptr; }
+    Members Slots() const {  // slot contents below the top, empty slots as null
+        Members slots;
+        for (int i = 0; i < Top(); ++i) {
+            slots.push_back((*this)[i]);
+        }
+        return slots;
+    }
 };
 
 class BagView : public DWXBag {

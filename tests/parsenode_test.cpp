@@ -2,8 +2,12 @@
 // from text, SetFrom with its class test, and copies.
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
+#include <services/utilhub.h>
 
+#include <float.h>
 #include <limits.h>
+#include <math.h>
+#include <stdio.h>
 #include <stdlib.h>
 
 #include <memory>
@@ -12,24 +16,55 @@
 namespace {
 
 std::string Text(const DWXParseTreeNode& node) {
-    char* text = node.GetAsString();
-    std::string result(text);
-    free(text);
-    return result;
+    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
+    return text.get();
 }
 
-TEST(ParseNodeTest, ValueTexts) {
-    EXPECT_EQ(Text(PTNBool("b", 0)), "FALSE");
-    EXPECT_EQ(Text(PTNBool("b", 5)), "TRUE");
+std::string Printed(const char* format, double value) {
+    char text[400];
+    snprintf(text, sizeof text, format, value);
+    return text;
+}
+
+TEST(ParseNodeTest, ValueTextsAndClassNames) {
+    const std::string longText(100000, 'w');
+    const struct {
+        std::unique_ptr<DWXParseTreeNode> node;
+        const char* className;
+        std::string text;
+    } cases[] = {
+        {std::make_unique<PTNInteger>("i", INT_MIN), "PTNInteger", "-2147483648"},
+        {std::make_unique<PTNInteger>("i", INT_MAX), "PTNInteger", "2147483647"},
+        {std::make_unique<PTNBool>("b", 0), "PTNBool", "FALSE"},
+        {std::make_unique<PTNBool>("b", -1), "PTNBool", "TRUE"},
+        {std::make_unique<PTNChar>("c", '\xE9'), "PTNChar", "\xE9"},
+        {std::make_unique<PTNChar>("c", 0), "PTNChar", ""},
+        {std::make_unique<PTNFloat>("f", -0.25f), "PTNFloat", "-0.250000"},
+        {std::make_unique<PTNFloat>("f", 1e30f), "PTNFloat", Printed("%f", 1e30f)},
+        {std::make_unique<PTNFloat>("f", 0.0078125f), "PTNFloat", Printed("%f", 0.0078125)},
+        {std::make_unique<PTNFloat>("f", -INFINITY), "PTNFloat", Printed("%f", -INFINITY)},
+        {std::make_unique<PTNFloat>("f", NAN), "PTNFloat", Printed("%f", NAN)},
+        {std::make_unique<PTNDouble>("d", 0.1), "PTNDouble", "0.1"},
+        {std::make_unique<PTNDouble>("d", 640), "PTNDouble", "640"},
+        {std::make_unique<PTNDouble>("d", -0.0), "PTNDouble", "-0"},
+        {std::make_unique<PTNDouble>("d", 1e21), "PTNDouble", MkName(1e21, -1)},
+        {std::make_unique<PTNString>("s", nullptr), "PTNString", "\\q\\q"},
+        {std::make_unique<PTNString>("s", ""), "PTNString", "\"\""},
+        {std::make_unique<PTNString>("s", longText.c_str()), "PTNString", "\"" + longText + "\""},
+        {std::make_unique<PTNIntegerList>("l", 0, nullptr), "PTNIntegerList", ""},
+        {std::make_unique<PTNInteger32List>("l", -1, nullptr), "PTNInteger32List", ""},
+        {std::make_unique<PTNDoubleList>("l", 0, nullptr), "PTNDoubleList", ""},
+        {std::make_unique<PTNStringList>("l", nullptr), "PTNStringList", ""},
+        {std::make_unique<PTNBase64>("b", nullptr, 0), "PTNBase64", ""},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(Text(*c.node), c.text) << c.className;
+        EXPECT_STREQ(c.node->GetClassName(), c.className);
+    }
     EXPECT_EQ(PTNBool("b", 5).GetValue(), 5);
-    EXPECT_EQ(Text(PTNChar("c", 'A')), "A");
-    EXPECT_EQ(Text(PTNChar("c", 0)), "");
-    EXPECT_EQ(Text(PTNChar("c", '\xE9')), "\xE9");
-    EXPECT_EQ(Text(PTNInteger("i", -42)), "-42");
-    EXPECT_EQ(Text(PTNInteger("i", INT_MIN)), "-2147483648");
-    EXPECT_EQ(Text(PTNFloat("f", 1.5f)), "1.500000");
-    EXPECT_EQ(Text(PTNFloat("f", -0.25f)), "-0.250000");
-    for (double value : {0.1, -2.5, 1.0 / 3.0, 1e300, 640.0}) {
+    EXPECT_EQ(PTNFloat("f", 1e30f).GetValue(), 1e30f);
+    // Doubles are written so that they read back exactly.
+    for (double value : {1.0 / 3.0, 1e300, 5e-324, -DBL_MAX, (double)INFINITY}) {
         EXPECT_EQ(atof(Text(PTNDouble("d", value)).c_str()), value);
     }
 }
@@ -83,7 +118,6 @@ TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
     PTNString text("s", "old");
     PTNString nullText("s", nullptr);
     text.SetFrom(&source);
-    EXPECT_STREQ(text.GetValue(), "old");
     text.SetFrom(&text);
     EXPECT_STREQ(text.GetValue(), "old");
     text.SetFrom(&nullText);
@@ -109,14 +143,10 @@ TEST(ParseNodeTest, CopiesOwnTheirBuffersAndHaveNoParent) {
         EXPECT_STREQ(node->GetName(), "title");
         EXPECT_EQ(Text(*node), "\"Main window\"");
     }
-}
-
-TEST(ParseNodeTest, NamesAndValuesAreOwnCopies) {
+    // Names and values are own copies, also when set from themselves.
     char name[] = "width";
     PTNString node(name, name);
     name[0] = 'W';
-    EXPECT_STREQ(node.GetName(), "width");
-    EXPECT_STREQ(node.GetValue(), "width");
     node.SetName(node.GetName());
     node.SetValue(node.GetValue());
     EXPECT_STREQ(node.GetName(), "width");

@@ -5,6 +5,7 @@
 
 #include <stdlib.h>
 
+#include <initializer_list>
 #include <memory>
 #include <string>
 
@@ -19,22 +20,25 @@ struct CountingNode : PTNInteger {
 int CountingNode::destroyed = 0;
 
 std::string Text(const DWXParseTreeNode& node) {
-    char* text = node.GetAsString();
-    std::string result(text);
-    free(text);
-    return result;
+    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
+    return text.get();
+}
+
+template <class Tree>
+Tree* With(Tree* tree, std::initializer_list<DWXParseTreeNode*> children) {
+    for (DWXParseTreeNode* child : children) {
+        tree->AddChild(child);
+    }
+    return tree;
 }
 
 TEST(SubTreeTest, OwnsAndDeletesEveryDescendantOnce) {
     CountingNode::destroyed = 0;
     {
         PTNSubTree root("root");
-        auto* inner = new PTNSubTree("inner");
         auto* leaf = new CountingNode("b", 2);
-        root.AddChild(new CountingNode("a", 1));
-        root.AddChild(inner);
-        root.AddChild(nullptr);
-        inner->AddChild(leaf);
+        auto* inner = With(new PTNSubTree("inner"), {leaf});
+        With(&root, {new CountingNode("a", 1), inner, nullptr});
         EXPECT_EQ(root.GetChildren()->GetCount(), 2);
         EXPECT_EQ(inner->GetParentRef(), &root);
         EXPECT_EQ(leaf->GetParentRef(), inner);
@@ -44,21 +48,14 @@ TEST(SubTreeTest, OwnsAndDeletesEveryDescendantOnce) {
 
 TEST(SubTreeTest, LookupsTakeTheFirstNamesake) {
     char* list[] = {const_cast<char*>("x"), nullptr};
-    PTNSubTree tree("t");
     auto* text = new PTNString("a", "first");
     auto* number = new PTNInteger("a", 2);
-    auto* inner = new PTNSubTree("inner");
-    tree.AddChild(text);
-    tree.AddChild(number);
-    tree.AddChild(new PTNInteger(nullptr, 0));  // a nameless child is never found
-    tree.AddChild(new PTNBool("flag", 5));
-    tree.AddChild(new PTNInteger("WIDTH", 640));
-    tree.AddChild(new PTNChar("c", 'q'));
-    tree.AddChild(new PTNDouble("d", 2.5));
-    tree.AddChild(new PTNString("nullString", nullptr));
-    tree.AddChild(new PTNStringList("list", list));
-    tree.AddChild(inner);
-    inner->AddChild(new PTNInteger("a", 3));
+    PTNSubTree tree("t");
+    With(&tree, {text, number, new PTNInteger(nullptr, 0),  // a nameless child is never found
+                 new PTNBool("flag", 5), new PTNInteger("WIDTH", 640), new PTNChar("c", 'q'),
+                 new PTNDouble("d", 2.5), new PTNString("nullString", nullptr),
+                 new PTNStringList("list", list),
+                 With(new PTNSubTree("inner"), {new PTNInteger("a", 3)})});
 
     EXPECT_EQ(tree.GetChild("a"), text);
     EXPECT_EQ(tree.GetChild("a", "PTNinteger"), number);
@@ -76,32 +73,24 @@ TEST(SubTreeTest, LookupsTakeTheFirstNamesake) {
     EXPECT_STREQ(tree.GetChildAsString("a"), "first");
     EXPECT_EQ(tree.GetChildAsString("nullString"), nullptr);
     EXPECT_STREQ(tree.GetChildAsStringList("list")[0], "x");
-    for (const char* name : {"absent", static_cast<const char*>(nullptr)}) {
-        EXPECT_STREQ(tree.GetChildAsString(name), "");
-        EXPECT_EQ(tree.GetChildAsInteger(name) + tree.GetChildAsBool(name), 0);
-        EXPECT_EQ(tree.GetChildAsChar(name), 0);
-        EXPECT_EQ(tree.GetChildAsDouble(name), 0.0);
+    // Absent, null, or a first namesake of another class: the defaults.
+    for (const char* name : {"absent", static_cast<const char*>(nullptr), "a"}) {
+        EXPECT_EQ(tree.GetChildAsChar(name) + tree.GetChildAsDouble(name), 0);
         EXPECT_EQ(tree.GetChildAsStringList(name), nullptr);
     }
-    // The first namesake decides, and one of another class gives the default.
+    for (const char* name : {"absent", static_cast<const char*>(nullptr)}) {
+        EXPECT_EQ(tree.GetChildAsInteger(name) + tree.GetChildAsBool(name), 0);
+    }
     EXPECT_EQ(tree.GetChildAsInteger("a"), 0);
-    EXPECT_EQ(tree.GetChildAsChar("a"), 0);
-    EXPECT_EQ(tree.GetChildAsDouble("a"), 0.0);
-    EXPECT_EQ(tree.GetChildAsStringList("a"), nullptr);
-    EXPECT_STREQ(tree.GetChildAsString("d"), "");
-}
-
-std::unique_ptr<PTNSubTree> Config() {
-    auto tree = std::make_unique<PTNSubTree>("config");
-    auto* colors = new PTNSubTree("colors");
-    tree->AddChild(new PTNInteger("width", 640));
-    tree->AddChild(colors);
-    colors->AddChild(new PTNString("fg", "red"));
-    return tree;
+    for (const char* name : {"absent", static_cast<const char*>(nullptr), "d"}) {
+        EXPECT_STREQ(tree.GetChildAsString(name), "");
+    }
 }
 
 TEST(SubTreeTest, CopiesAreDeepAndSurviveTheSource) {
-    auto source = Config();
+    auto source = std::make_unique<PTNSubTree>("config");
+    With(source.get(), {new PTNInteger("width", 640),
+                        With(new PTNSubTree("colors"), {new PTNString("fg", "red")})});
     const std::string text = Text(*source);
     std::unique_ptr<PTNSubTree> deep(source->DeepCopy());
     PTNSubTree constructed(*source);
@@ -112,8 +101,8 @@ TEST(SubTreeTest, CopiesAreDeepAndSurviveTheSource) {
     for (PTNSubTree* copy : {deep.get(), &constructed, &assigned}) {
         EXPECT_EQ(Text(*copy), text);
         EXPECT_EQ(copy->GetParentRef(), nullptr);
-        EXPECT_EQ(copy->GetChild("colors")->GetParentRef(), copy);
         auto* colors = static_cast<PTNSubTree*>(copy->GetChild("colors"));
+        EXPECT_EQ(colors->GetParentRef(), copy);
         EXPECT_EQ(colors->GetChild("fg")->GetParentRef(), colors);
     }
     // Assigning a subtree from its own descendant, and from itself.
@@ -126,7 +115,6 @@ TEST(SubTreeTest, CopiesAreDeepAndSurviveTheSource) {
 TEST(ExceptionListTest, MembershipIgnoresCaseAndCopiesAreDeep) {
     ExceptionList list;
     list.Add("color");
-    list.Add("color");
     list.Add(nullptr);
     for (int i = 0; i < 20; ++i) {
         list.Add(("name" + std::to_string(i)).c_str());
@@ -138,27 +126,19 @@ TEST(ExceptionListTest, MembershipIgnoresCaseAndCopiesAreDeep) {
     list = ExceptionList();
     EXPECT_EQ(list.IsMember("color"), 0);
     for (const ExceptionList* l : {&copy, &assigned}) {
-        EXPECT_EQ(l->IsMember("COLOR"), 1);
-        EXPECT_EQ(l->IsMember("name19"), 1);
-        EXPECT_EQ(l->IsMember("colors"), 0);
-        EXPECT_EQ(l->IsMember("old"), 0);
-        EXPECT_EQ(l->IsMember(nullptr), 0);
+        EXPECT_EQ(l->IsMember("COLOR") + l->IsMember("name19"), 2);
+        EXPECT_EQ(l->IsMember("colors") + l->IsMember("old") + l->IsMember(nullptr), 0);
     }
 }
 
 // Both trees: a, color, inner { b, Color { c }, COLOR }, values base + 1..5.
 std::unique_ptr<PTNSubTree> MergeTree(int base) {
-    auto tree = std::make_unique<PTNSubTree>(base == 0 ? "mine" : "theirs");
-    auto* inner = new PTNSubTree("inner");
-    auto* color = new PTNSubTree("Color");
-    tree->AddChild(new PTNInteger("a", base + 1));
-    tree->AddChild(new PTNInteger("color", base + 2));
-    tree->AddChild(inner);
-    inner->AddChild(new PTNInteger("b", base + 3));
-    inner->AddChild(color);
-    inner->AddChild(new PTNInteger("COLOR", base + 4));
-    color->AddChild(new PTNInteger("c", base + 5));
-    return tree;
+    auto* color = With(new PTNSubTree("Color"), {new PTNInteger("c", base + 5)});
+    auto* inner = With(new PTNSubTree("inner"),
+                       {new PTNInteger("b", base + 3), color, new PTNInteger("COLOR", base + 4)});
+    return std::unique_ptr<PTNSubTree>(
+        With(new PTNSubTree(base == 0 ? "mine" : "theirs"),
+             {new PTNInteger("a", base + 1), new PTNInteger("color", base + 2), inner}));
 }
 
 std::string MergedValues(const char* exception, const char* exception2 = nullptr) {
@@ -182,21 +162,12 @@ TEST(MergeTest, ExceptionsFirstMatchesAndClasses) {
     EXPECT_EQ(MergedValues("color"), "101 2 103 5 4 ");          // at every depth, whole subtrees
     EXPECT_EQ(MergedValues("inner", "mine"), "101 102 3 5 4 ");  // roots never compared
 
-    PTNSubTree mine("m");
-    mine.AddChild(new PTNInteger("x", 0));
-    mine.AddChild(new PTNInteger("X", 0));
-    mine.AddChild(new PTNInteger("y", 0));
-    mine.AddChild(new PTNInteger(nullptr, 0));
-    auto* s = new PTNSubTree("s");
-    mine.AddChild(s);
-    PTNSubTree theirs("t");
-    theirs.AddChild(new PTNInteger("x", 1));
-    theirs.AddChild(new PTNInteger("x", 2));
-    theirs.AddChild(new PTNString("y", "7"));
-    theirs.AddChild(new PTNInteger("y", 7));
-    theirs.AddChild(new PTNInteger(nullptr, 8));
-    theirs.AddChild(new PTNInteger("s", 9));
-    theirs.AddChild(new PTNInteger("z", 9));
+    PTNSubTree mine("m"), theirs("t");
+    With(&mine, {new PTNInteger("x", 0), new PTNInteger("X", 0), new PTNInteger("y", 0),
+                 new PTNInteger(nullptr, 0), new PTNSubTree("s")});
+    With(&theirs, {new PTNInteger("x", 1), new PTNInteger("x", 2), new PTNString("y", "7"),
+                   new PTNInteger("y", 7), new PTNInteger(nullptr, 8), new PTNInteger("s", 9),
+                   new PTNInteger("z", 9)});
     mine.SetFrom(&theirs, ExceptionList());
     mine.SetFrom(nullptr, ExceptionList());
     mine.SetFrom(static_cast<DWXParseTreeNode*>(&theirs));  // no effect on a subtree
