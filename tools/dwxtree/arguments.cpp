@@ -12,10 +12,10 @@ namespace {
 // clash with one.
 const char kProgramEntry[] = "dwxtree";
 
-const OptionSpec* FindSpec(const std::vector<OptionSpec>& specs, const char* name) {
-    for (const OptionSpec& spec : specs) {
-        if (_stricmp(spec.name, name) == 0) {
-            return &spec;
+const OptionRule* FindRule(const std::vector<OptionRule>& rules, const char* name) {
+    for (const OptionRule& rule : rules) {
+        if (_stricmp(rule.name, name) == 0) {
+            return &rule;
         }
     }
     return nullptr;
@@ -36,7 +36,7 @@ bool OpensOption(const char* argument) {
     return argument[0] == '-' && argument[1] != '-';
 }
 
-bool Arguments::Parse(int argc, const char* const* argv, const std::vector<OptionSpec>& specs,
+bool Arguments::Parse(int argc, const char* const* argv, const std::vector<OptionRule>& rules,
                       std::string& error) {
     oGiven.clear();
     oPositional.clear();
@@ -56,25 +56,25 @@ bool Arguments::Parse(int argc, const char* const* argv, const std::vector<Optio
         if (!OpensOption(written)) {
             continue;
         }
-        const OptionSpec* spec = FindSpec(specs, written);
-        if (!spec) {
+        const OptionRule* rule = FindRule(rules, written);
+        if (!rule) {
             error = std::string("unknown option '") + written + "'";
             return false;
         }
-        if (Has(spec->name)) {
-            error = std::string("option ") + spec->name + " given more than once";
+        if (Has(rule->name)) {
+            error = std::string("option ") + rule->name + " given more than once";
             return false;
         }
         std::vector<std::string> values = ValuesOf(line, written);
-        size_t keep = spec->arity < 0 ? values.size() : static_cast<size_t>(spec->arity);
-        if (values.size() < keep || (spec->arity < 0 && values.empty())) {
-            error = std::string("option ") + spec->name + " needs a value";
+        size_t keep = rule->arity < 0 ? values.size() : static_cast<size_t>(rule->arity);
+        if (values.size() < keep || (rule->arity < 0 && values.empty())) {
+            error = std::string("option ") + rule->name + " needs a value";
             return false;
         }
         oPositional.insert(oPositional.end(), values.begin() + static_cast<long>(keep),
                            values.end());
         values.resize(keep);
-        oGiven.push_back(Given{spec->name, std::move(values)});
+        oGiven.push_back(Given{rule->name, std::move(values)});
     }
     return true;
 }

@@ -12,7 +12,7 @@ namespace dwxtree {
 // 0 or 1, or -1 for one or more. Values beyond the arity are positional
 // arguments, so "-o out.cfg base.cfg" gives -o the value out.cfg and leaves
 // base.cfg positional.
-struct OptionSpec {
+struct OptionRule {
     const char* name;
     int arity;
 };
@@ -21,7 +21,7 @@ class Arguments {
   public:
     // Parses argv[1..argc-1]. Returns false and sets `error` for an unknown
     // option, an option given twice or an option without its value.
-    bool Parse(int argc, const char* const* argv, const std::vector<OptionSpec>& specs,
+    bool Parse(int argc, const char* const* argv, const std::vector<OptionRule>& rules,
                std::string& error);
 
     // The arguments that belong to no option, in command-line order.
@@ -33,7 +33,7 @@ class Arguments {
 
   private:
     struct Given {
-        std::string name;  // the spec's spelling
+        std::string name;  // the rule's spelling
         std::vector<std::string> values;
     };
     std::vector<Given> oGiven;

@@ -14,7 +14,7 @@
 namespace {
 
 using dwxtree::Arguments;
-using dwxtree::OptionSpec;
+using dwxtree::OptionRule;
 
 const char kUsage[] =
     "usage: dwxtree SUBCOMMAND ARGUMENTS\n"
@@ -43,7 +43,7 @@ struct Subcommand {
     const char* name;
     int files;     // positional arguments after the subcommand
     int optional;  // how many of them may be left out
-    std::vector<OptionSpec> options;
+    std::vector<OptionRule> options;
     int (*run)(const Arguments&);
     const char* help;
 };
@@ -157,7 +157,7 @@ int main(int argc, char** argv) {
     // rest, so a first pass accepts every option the subcommands know.
     Arguments args;
     std::string error;
-    std::vector<OptionSpec> all;
+    std::vector<OptionRule> all;
     for (const Subcommand& command : kSubcommands) {
         all.insert(all.end(), command.options.begin(), command.options.end());
     }
