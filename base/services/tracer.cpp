@@ -1,5 +1,7 @@
 #include <services/tracer.h>
 
+#include "utilhub_internal.h"
+
 #include <stdarg.h>
 
 #include <string>
@@ -23,21 +25,9 @@ void Debugger::Debug(const char* message, int level, const char* module, const c
 
 const char* Debugger::FormatString(const char* format, ...) {
     thread_local std::string text;
-    if (!format) {
-        text.clear();
-        return text.c_str();
-    }
     va_list args;
     va_start(args, format);
-    va_list measure;
-    va_copy(measure, args);
-    int length = vsnprintf(nullptr, 0, format, measure);
-    va_end(measure);
-    if (length < 0) {
-        length = 0;
-    }
-    text.assign(static_cast<size_t>(length), '\0');
-    vsnprintf(&text[0], static_cast<size_t>(length) + 1, format, args);
+    text = utilhub_internal::FormatV(format, args);
     va_end(args);
     return text.c_str();
 }

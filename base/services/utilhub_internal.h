@@ -1,8 +1,11 @@
 // Helpers shared by the utilhub sources; not part of the public interface.
 #pragma once
 
+#include <stdarg.h>
 #include <stddef.h>
 #include <string.h>
+
+#include <string>
 
 namespace utilhub_internal {
 
@@ -30,5 +33,9 @@ inline const char* LineAt(const char* text, const char* end, size_t* length) {
 inline bool StartsWithBom(const char* text, size_t length) {
     return length >= 3 && memcmp(text, "\xEF\xBB\xBF", 3) == 0;
 }
+
+// printf-style formatting of `args` into a string of the right size; an
+// empty text for a null or unusable format.
+std::string FormatV(const char* format, va_list args);
 
 }  // namespace utilhub_internal

@@ -75,24 +75,30 @@ std::string& TrimWhitespace(std::string& text) {
     return text;
 }
 
-char* HSPrintf(const char* format, ...) {
+std::string utilhub_internal::FormatV(const char* format, va_list args) {
+    std::string text;
     if (!format) {
-        return HString("");
+        return text;
     }
-    va_list args;
-    va_start(args, format);
     va_list measure;
     va_copy(measure, args);
     int length = vsnprintf(nullptr, 0, format, measure);
     va_end(measure);
-    if (length < 0) {
-        va_end(args);
-        return HString("");
+    if (length > 0) {
+        text.resize(static_cast<size_t>(length));
+        vsnprintf(&text[0], static_cast<size_t>(length) + 1, format, args);
     }
-    char* text = static_cast<char*>(HMalloc(static_cast<size_t>(length) + 1));
-    vsnprintf(text, static_cast<size_t>(length) + 1, format, args);
-    va_end(args);
     return text;
+}
+
+char* HSPrintf(const char* format, ...) {
+    va_list args;
+    va_start(args, format);
+    std::string text = utilhub_internal::FormatV(format, args);
+    va_end(args);
+    char* copy = static_cast<char*>(HMalloc(text.size() + 1));
+    memcpy(copy, text.c_str(), text.size() + 1);
+    return copy;
 }
 
 const char* IMPTime(const void* unused, int kind) {
