@@ -153,4 +153,36 @@ TEST(ParseNodeTest, CopiesOwnTheirBuffersAndHaveNoParent) {
     EXPECT_STREQ(node.GetValue(), "width");
 }
 
+TEST(ParseNodeTest, NamesOfEveryLengthSurviveRenamesAndCopies) {
+    // Short names are kept in the node and longer ones on the heap: every
+    // change between the two, and renames from the node's own name or a
+    // part of it, keep the text (ASan checks the storage).
+    const char* const names[] = {"", "x", "seven77", "eight888", "a much longer name", nullptr};
+    for (const char* first : names) {
+        for (const char* second : names) {
+            PTNInteger node(first, 1);
+            EXPECT_STREQ(node.GetName(), first);
+            node.SetName(second);
+            EXPECT_STREQ(node.GetName(), second);
+            PTNInteger copy(node);
+            PTNInteger assigned(first, 2);
+            assigned = node;
+            std::unique_ptr<DWXParseTreeNode> cloned(node.Copy());
+            node.SetName("changed after copying");
+            for (const DWXParseTreeNode* other :
+                 {static_cast<DWXParseTreeNode*>(&copy), static_cast<DWXParseTreeNode*>(&assigned),
+                  cloned.get()}) {
+                EXPECT_STREQ(other->GetName(), second);
+            }
+        }
+    }
+    PTNInteger node("eight888", 1);
+    node.SetName(node.GetName() + 1);  // long to short, from inside the old name
+    EXPECT_STREQ(node.GetName(), "ight888");
+    node.SetName(node.GetName() + 2);  // short to short, overlapping
+    EXPECT_STREQ(node.GetName(), "ht888");
+    node.SetName(node.GetName());
+    EXPECT_STREQ(node.GetName(), "ht888");
+}
+
 }  // namespace

@@ -91,9 +91,18 @@ TEST(TokenTest, ReadingExpandsTranslationsAndListForms) {
         {"mktokenstring(a,b)", "mktokenstring(a,b)"},
         {"\"_(Red) MkTokenString\"", "_(Red) MkTokenString"},  // the keyword blocks the call
         {"@@MkTokenString(a,b)", "x|y"},                       // translated, then expanded
+        {"\\@@Cancel", "Abbrechen"},                           // an escape may make the '@'
+        {"\\_(Red)", "Rot"},
+        {"\"\t@@Cancel\"", "\t@@Cancel"},
+        {"Main", "Main"},
+        {"\xC3\xA9_(Red)", "\xC3\xA9_(Red)"},
     };
     for (const Case& c : cases) {
         EXPECT_EQ(Unquote(c.in), c.out) << c.in;
+        // The reader unquotes its String lines the same way.
+        PTNSubTree tree("t");
+        tree.BuildFromString((std::string("(s String ") + c.in + ")").c_str());
+        EXPECT_STREQ(tree.GetChildAsString("s"), c.out) << c.in;
     }
     RTSetMessageCatalogue(previous);
 }

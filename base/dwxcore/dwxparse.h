@@ -49,8 +49,16 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
     DWXParseTreeNode& operator=(const DWXParseTreeNode& other);
 
   private:
+    // A name this short (its terminator included) is kept in the node
+    // itself, which saves most nodes a heap block of their own; pcName points
+    // at whichever storage holds the name (null for a null name).
+    static constexpr size_t kShortName = 8;
+    void InitName(const char* name);
+    void FreeName();
+
     char* pcName;
     PTNSubTree* poParent;
+    char acShortName[kShortName];
 };
 
 // ---------------------------------------------------------------------------
@@ -189,6 +197,9 @@ class DWXCORE_API PTNString : public DWXParseTreeNode {
     void SetFrom(DWXParseTreeNode* other) override;
 
   private:
+    // The reader's way to hand over a value it has already allocated.
+    friend struct PTNStringAdopter;
+
     char* pcValue;
 };
 

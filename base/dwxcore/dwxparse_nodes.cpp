@@ -4,6 +4,7 @@
 #include <services/rtprim.h>
 
 #include <stdlib.h>
+#include <string.h>
 
 #include <string>
 
@@ -30,10 +31,14 @@ char* HeapText(char* buffer, char* end) {
 // ---------------------------------------------------------------------------
 // DWXParseTreeNode
 
-DWXParseTreeNode::DWXParseTreeNode(const char* name) : pcName(HString(name)), poParent(nullptr) {}
+DWXParseTreeNode::DWXParseTreeNode(const char* name) : pcName(nullptr), poParent(nullptr) {
+    InitName(name);
+}
 
 DWXParseTreeNode::DWXParseTreeNode(const DWXParseTreeNode& other)
-    : DWXObject(other), pcName(HString(other.pcName)), poParent(nullptr) {}
+    : DWXObject(other), pcName(nullptr), poParent(nullptr) {
+    InitName(other.pcName);
+}
 
 DWXParseTreeNode& DWXParseTreeNode::operator=(const DWXParseTreeNode& other) {
     if (this != &other) {
@@ -43,14 +48,42 @@ DWXParseTreeNode& DWXParseTreeNode::operator=(const DWXParseTreeNode& other) {
 }
 
 DWXParseTreeNode::~DWXParseTreeNode() {
-    free(pcName);
+    FreeName();
     pcName = nullptr;
     poParent = nullptr;
 }
 
+void DWXParseTreeNode::InitName(const char* name) {
+    if (name == nullptr) {
+        pcName = nullptr;
+        return;
+    }
+    size_t size = strlen(name) + 1;
+    if (size <= kShortName) {
+        memcpy(acShortName, name, size);
+        pcName = acShortName;
+    } else {
+        pcName = HString(name);
+    }
+}
+
+void DWXParseTreeNode::FreeName() {
+    if (pcName != acShortName) {
+        free(pcName);
+    }
+}
+
 void DWXParseTreeNode::SetName(const char* name) {
-    char* copy = HString(name);  // copied first: `name` may be our own buffer
-    free(pcName);
+    // Copied first: `name` may be our own name or lie inside it.
+    if (name != nullptr && strlen(name) < kShortName) {
+        char copy[kShortName];
+        memcpy(copy, name, strlen(name) + 1);
+        FreeName();
+        InitName(copy);
+        return;
+    }
+    char* copy = HString(name);
+    FreeName();
     pcName = copy;
 }
 

@@ -29,6 +29,18 @@
 #include <utility>
 #include <vector>
 
+// Builds String leaves around values the reader has already allocated.
+struct PTNStringAdopter {
+    // A new leaf that owns `value` (a heap text), which is freed here if the
+    // leaf cannot be built.
+    static PTNString* Make(const char* name, char* value) {
+        std::unique_ptr<char, void (*)(void*)> owned(value, free);
+        PTNString* node = new PTNString(name, nullptr);
+        node->pcValue = owned.release();
+        return node;
+    }
+};
+
 namespace {
 
 // Nested includes allowed below the file the reading started from.
@@ -379,17 +391,17 @@ void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, s
 
     switch (kind) {
         case Keyword::String: {
-            std::string value;
+            char* value;
             if (valueEnd == 3) {
-                value = UnquoteToken(third);
+                value = UnquoteTokenToHeap(third, oLengths[2]);
             } else {
                 oJoined.clear();
                 for (size_t i = 2; i < valueEnd; ++i) {
-                    oJoined.append(oTokens[i]);
+                    oJoined.append(oTokens[i], oLengths[i]);
                 }
-                value = UnquoteToken(oJoined.c_str());
+                value = UnquoteTokenToHeap(oJoined.data(), oJoined.size());
             }
-            node = std::make_unique<PTNString>(name, value.c_str());
+            node.reset(PTNStringAdopter::Make(name, value));
             break;
         }
         case Keyword::StringList: {

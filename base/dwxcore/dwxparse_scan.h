@@ -160,3 +160,8 @@ inline double ScanDouble(const char* text) {
 }
 
 }  // namespace dwxparse_scan
+
+// The value of the token of `length` bytes at `token`, as UnquoteToken gives
+// it, in a heap buffer that the caller frees with free(); the reader hands it
+// to its String leaf as it is. Defined in dwxparse_token.cpp.
+char* UnquoteTokenToHeap(const char* token, size_t length);

@@ -4,6 +4,7 @@
 #include <services/rtprim.h>
 #include <services/utilhub.h>
 
+#include <stdlib.h>
 #include <string.h>
 
 namespace {
@@ -28,6 +29,54 @@ void ExpandTranslationPrefix(std::string& value) {
         const std::string message(value, mark + 1);
         value = _(message.c_str());
     }
+}
+
+// Writes the value of `token` with unquoted quote marks dropped and escapes
+// undone at `out` (room for the token's length) and returns its end; no
+// terminator is written. Runs of plain bytes are copied whole.
+char* Unescape(const char* token, char* out) {
+    const char* p = token;
+    for (;;) {
+        const char* run = p;
+        while (*p != '\0' && *p != '"' && *p != '\\') {
+            ++p;
+        }
+        memcpy(out, run, static_cast<size_t>(p - run));
+        out += p - run;
+        if (*p == '\0') {
+            return out;
+        }
+        if (*p++ == '"') {
+            continue;
+        }
+        if (*p == '\0') {
+            return out;  // a lone final backslash stands for nothing
+        }
+        *out++ = *p == 'q' ? '"' : *p == 'n' ? '\n' : *p;
+        ++p;
+    }
+}
+
+// Whether the expansions may change the value that runs from `value` to
+// `end`. They never change a value whose first byte is visible ASCII other
+// than '@' (the translation prefix), 'M' (MkTokenString as the first word)
+// and '_' (a translation call): MkTokenString acts only as the first word, and
+// a translation call only when '_' is the first non-white byte.
+bool MayExpand(const char* value, const char* end) {
+    if (value == end) {
+        return false;
+    }
+    unsigned char first = static_cast<unsigned char>(value[0]);
+    return first <= ' ' || first >= 0x7f || first == '@' || first == 'M' || first == '_';
+}
+
+// The expansions of an unescaped value, in their order.
+void ExpandValue(std::string& value) {
+    if (!MayExpand(value.data(), value.data() + value.size())) {
+        return;
+    }
+    ExpandTranslationPrefix(value);
+    ExpandMkTokenString(value);
 }
 
 }  // namespace
@@ -59,27 +108,25 @@ char* QuoteToken(const char* value) {
 }
 
 std::string UnquoteToken(const char* token) {
-    std::string value;
     if (token == nullptr) {
-        return value;
+        return std::string();
     }
-    value.reserve(strlen(token) + 1);
-    for (const char* p = token; *p != '\0'; ++p) {
-        if (*p == '"') {
-            continue;
-        }
-        if (*p != '\\') {
-            value += *p;
-            continue;
-        }
-        ++p;
-        if (*p == '\0') {
-            break;  // a lone final backslash stands for nothing
-        }
-        value += *p == 'q' ? '"' : *p == 'n' ? '\n' : *p;
+    std::string value(strlen(token), '\0');
+    value.resize(static_cast<size_t>(Unescape(token, &value[0]) - value.data()));
+    ExpandValue(value);
+    return value;
+}
+
+char* UnquoteTokenToHeap(const char* token, size_t length) {
+    char* value = static_cast<char*>(HMalloc(length + 1));
+    char* end = Unescape(token, value);
+    *end = '\0';
+    if (MayExpand(value, end)) {
+        std::string expanded(value, end);
+        free(value);
+        ExpandValue(expanded);
+        value = HString(expanded.c_str());
     }
-    ExpandTranslationPrefix(value);
-    ExpandMkTokenString(value);
     return value;
 }
 
