@@ -72,11 +72,11 @@ inline bool WordMatches(const char* text, const KeywordPattern& keyword, size_t 
 inline bool MatchesAt(const char* text, const KeywordPattern& keyword) {
     size_t length = keyword.length;
     if (length >= 8) {
-        return WordMatches<uint64_t>(text, keyword, 0) &
+        return WordMatches<uint64_t>(text, keyword, 0) &&
                WordMatches<uint64_t>(text, keyword, length - 8);
     }
     if (length >= 4) {
-        return WordMatches<uint32_t>(text, keyword, 0) &
+        return WordMatches<uint32_t>(text, keyword, 0) &&
                WordMatches<uint32_t>(text, keyword, length - 4);
     }
     for (size_t i = 0; i < length; ++i) {
@@ -160,8 +160,3 @@ inline double ScanDouble(const char* text) {
 }
 
 }  // namespace dwxparse_scan
-
-// The value of the token of `length` bytes at `token`, as UnquoteToken gives
-// it, in a heap buffer that the caller frees with free(); the reader hands it
-// to its String leaf as it is. Defined in dwxparse_token.cpp.
-char* UnquoteTokenToHeap(const char* token, size_t length);

@@ -2,6 +2,8 @@
 // the string leaves, the reader and the writer. Internal to the library.
 #pragma once
 
+#include <stddef.h>
+
 #include <string>
 
 // The token for `value`: between double quotes, with '"', line feed and
@@ -12,6 +14,10 @@ char* QuoteToken(const char* value);
 // The value of `token`: unquoted quote marks dropped, escapes undone, then the
 // '@' translation forms and ExpandMkTokenString applied. Null gives "".
 std::string UnquoteToken(const char* token);
+
+// The same value for the `length` bytes at `token`, in a heap buffer that the
+// caller frees with free(); the reader hands it to its String leaf as it is.
+char* UnquoteTokenToHeap(const char* token, size_t length);
 
 // Rewrites MkTokenString(a,b,...) as a|b|..., dropping the items from the
 // first NULL item on; a value without the keyword gets ExpandTranslationCall.
