@@ -117,21 +117,6 @@ DWXColor::DWXColor(int alpha, int red, int green, int blue) {
     SetARGB(alpha, red, green, blue);
 }
 
-DWXColor::DWXColor(const DWXColor& other)
-    : DWXObject(other),
-      nAlpha(other.nAlpha),
-      nRed(other.nRed),
-      nGreen(other.nGreen),
-      nBlue(other.nBlue) {}
-
-DWXColor& DWXColor::operator=(const DWXColor& other) {
-    nAlpha = other.nAlpha;
-    nRed = other.nRed;
-    nGreen = other.nGreen;
-    nBlue = other.nBlue;
-    return *this;
-}
-
 DWXColor::~DWXColor() {}
 
 bool DWXColor::operator==(const DWXColor& other) const {

@@ -17,8 +17,8 @@ class DWXCORE_API DWXColor : public DWXObject {
     DWXColor();
     DWXColor(int red, int green, int blue);
     DWXColor(int alpha, int red, int green, int blue);
-    DWXColor(const DWXColor& other);
-    DWXColor& operator=(const DWXColor& other);
+    DWXColor(const DWXColor& other) = default;
+    DWXColor& operator=(const DWXColor& other) = default;
     ~DWXColor() override;
 
     // Alpha takes part in the comparison: DWXColor() differs from DWXColor(0, 0, 0).

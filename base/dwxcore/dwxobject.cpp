@@ -115,19 +115,6 @@ DWXIter::DWXIter(const DWXContainer* container)
     }
 }
 
-DWXIter::DWXIter(const DWXIter& other)
-    : DWXObject(other),
-      poTarget(other.poTarget),
-      poCurrent(other.poCurrent),
-      nPosition(other.nPosition) {}
-
-DWXIter& DWXIter::operator=(const DWXIter& other) {
-    poTarget = other.poTarget;
-    poCurrent = other.poCurrent;
-    nPosition = other.nPosition;
-    return *this;
-}
-
 DWXIter::~DWXIter() {}
 
 const char* DWXIter::GetClassName() const {

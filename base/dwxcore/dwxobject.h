@@ -102,8 +102,8 @@ class DWXCORE_API DWXIter : public DWXObject {
     DWXIter();
     // Binds to `container` and, when it is not null, stands on its first member.
     explicit DWXIter(const DWXContainer* container);
-    DWXIter(const DWXIter& other);
-    DWXIter& operator=(const DWXIter& other);
+    DWXIter(const DWXIter& other) = default;
+    DWXIter& operator=(const DWXIter& other) = default;
     ~DWXIter() override;
 
     const char* GetClassName() const override;

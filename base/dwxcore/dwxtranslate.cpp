@@ -24,22 +24,6 @@ DWXTranslate::DWXTranslate()
       dDestX2(0.0),
       dDestY2(0.0) {}
 
-DWXTranslate& DWXTranslate::operator=(const DWXTranslate& other) {
-    dScaleX = other.dScaleX;
-    dOffsetX = other.dOffsetX;
-    dScaleY = other.dScaleY;
-    dOffsetY = other.dOffsetY;
-    dSrcX1 = other.dSrcX1;
-    dSrcY1 = other.dSrcY1;
-    dSrcX2 = other.dSrcX2;
-    dSrcY2 = other.dSrcY2;
-    dDestX1 = other.dDestX1;
-    dDestY1 = other.dDestY1;
-    dDestX2 = other.dDestX2;
-    dDestY2 = other.dDestY2;
-    return *this;
-}
-
 void DWXTranslate::SetSrcRect(double x1, double y1, double x2, double y2) {
     dSrcX1 = x1;
     dSrcY1 = y1;

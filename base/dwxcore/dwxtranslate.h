@@ -12,7 +12,7 @@ class DWXCORE_API DWXTranslate {
     // Both rectangles and the map are zero: every point maps to 0 both ways.
     DWXTranslate();
     DWXTranslate(const DWXTranslate& other) = default;
-    DWXTranslate& operator=(const DWXTranslate& other);
+    DWXTranslate& operator=(const DWXTranslate& other) = default;
 
     // Store the corners and recompute the map. A source with equal x or equal
     // y corners keeps the map that was in force; a destination of zero width
