@@ -1,5 +1,7 @@
 // The Base64 codec and leaf: RFC 4648 vectors, every short length and byte
 // value, the stop-at-first-invalid rule, and the node's text handling.
+#include "tree_test_util.h"
+
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 
@@ -39,11 +41,6 @@ std::string PiecewiseDecode(const std::string& text) {
         bytes += base64_decode(text.substr(i, stop - i < 4 ? stop - i : 4));
     }
     return bytes;
-}
-
-std::string Text(const DWXParseTreeNode& node) {
-    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
-    return text.get();
 }
 
 std::string Decoded(const PTNBase64& node, const char* text = nullptr) {

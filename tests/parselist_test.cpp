@@ -1,4 +1,6 @@
 // The list leaves: texts, reading from text and tokens, SetFrom rules, copies.
+#include "tree_test_util.h"
+
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 #include <services/utilhub.h>
@@ -12,11 +14,6 @@
 #include <vector>
 
 namespace {
-
-std::string Text(const DWXParseTreeNode& node) {
-    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
-    return text.get();
-}
 
 template <class List>
 auto Elements(const List& list) {

@@ -1,5 +1,7 @@
 // The node model and the scalar leaves: class names, value texts, reading
 // from text, SetFrom with its class test, and copies.
+#include "tree_test_util.h"
+
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 #include <services/utilhub.h>
@@ -14,11 +16,6 @@
 #include <string>
 
 namespace {
-
-std::string Text(const DWXParseTreeNode& node) {
-    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
-    return text.get();
-}
 
 std::string Printed(const char* format, double value) {
     char text[400];

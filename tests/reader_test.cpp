@@ -1,6 +1,9 @@
 // Reading the text form into trees: line kinds, keywords, the ')' cut, line
 // numbers in reports, errors inside and outside subtrees, includes, and
 // write-then-read round trips. Files live in a fresh temp directory.
+#include "scratch_dir.h"
+#include "tree_test_util.h"
+
 #include <dwxcore/dwxparse.h>
 #include <services/tracer.h>
 #include <services/utilhub.h>
@@ -11,8 +14,6 @@
 #include <stdlib.h>
 #include <string.h>
 
-#include <filesystem>
-#include <fstream>
 #include <functional>
 #include <memory>
 #include <sstream>
@@ -20,8 +21,6 @@
 #include <vector>
 
 namespace {
-
-namespace fs = std::filesystem;
 
 using Texts = std::vector<std::string>;
 Texts gReports;  // "code/severity message"
@@ -35,62 +34,20 @@ class ReaderTest : public ::testing::Test {
     void SetUp() override {
         gReports.clear();
         oPrevious = IMPSetErrorHandler(Capture);
-        oDir = fs::temp_directory_path() /
-               ("reader_test_" + std::to_string(::getpid()) + "_" +
-                ::testing::UnitTest::GetInstance()->current_test_info()->name());
-        fs::create_directories(oDir);
     }
     void TearDown() override {
         IMPSetErrorHandler(oPrevious);
-        fs::remove_all(oDir);
         unsetenv(DWX_ETC_PATH_VARIABLE);
         unsetenv(DWX_PRO_PATH_VARIABLE);
     }
-    std::string Write(const std::string& name, const std::string& text) {
-        fs::path path = oDir / name;
-        fs::create_directories(path.parent_path());
-        std::ofstream(path, std::ios::binary) << text;
-        return path.string();
-    }
-    // Reads a file opened the way hosts open it; closed also when the read throws.
-    static void ReadFile(PTNSubTree& tree, const std::string& path) {
-        std::unique_ptr<FILE, int (*)(FILE*)> stream(DKOpen(path.c_str(), 4, "r"), DKClose);
-        ASSERT_NE(stream, nullptr);
-        tree.BuildFromFile(stream.get());
-    }
-
     IMPErrorHandler oPrevious = nullptr;
-    fs::path oDir;
+    ScratchDir oDir;
 };
 
 std::unique_ptr<PTNSubTree> Read(const std::string& text) {
     auto tree = std::make_unique<PTNSubTree>("root");
     tree->BuildFromString(text.c_str());
     return tree;
-}
-
-std::string ValueText(const DWXParseTreeNode* node) {
-    char* text = node->GetAsString();
-    std::string value = text ? text : "(null)";
-    free(text);
-    return value;
-}
-
-// The names of the children, joined with blanks, subtrees as name{...}; with
-// `values`, each leaf also as :Class=value.
-std::string Shape(const PTNSubTree* tree, bool values = false) {
-    std::string shape;
-    DWXIter it(tree->GetChildren());
-    for (DWXObject* object = it.Current(); object; object = it.Next()) {
-        auto* node = static_cast<DWXParseTreeNode*>(object);
-        shape += (shape.empty() ? "" : " ") + std::string(node->GetName());
-        if (auto* sub = dynamic_cast<PTNSubTree*>(node)) {
-            shape += "{" + Shape(sub, values) + "}";
-        } else if (values) {
-            shape += std::string(":") + node->GetClassName() + "=" + ValueText(node);
-        }
-    }
-    return shape;
 }
 
 TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
@@ -252,7 +209,7 @@ TEST_F(ReaderTest, CommentLinesAndTreeStart) {
 // A stream DKOpen did not open is read from its own content, from its start,
 // and left at its start; reports name it "Memory".
 TEST_F(ReaderTest, ForeignStreams) {
-    FILE* foreign = fopen(Write("main.cfg", "(a Integer 1)\r\n\n(bad)\n").c_str(), "r");
+    FILE* foreign = fopen(oDir.Write("main.cfg", "(a Integer 1)\r\n\n(bad)\n").c_str(), "r");
     ASSERT_NE(foreign, nullptr);
     fgetc(foreign);
     PTNSubTree tree("root");
@@ -306,7 +263,7 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
         "(s SubTree\n" + many + ")\n",
     };
     for (const std::string& text : texts) {
-        std::string path = Write("case.cfg", text);
+        std::string path = oDir.Write("case.cfg", text);
         PTNSubTree inPlace("root"), fromList("root"), fromBuffer("root");
         std::string expected = Outcome(fromList, [&] {
             std::unique_ptr<char*, void (*)(char**)> lines(TextFileToStringList(path.c_str()),
@@ -326,80 +283,83 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
 }
 
 TEST_F(ReaderTest, IncludesPlaceNodesAndCountOwnLines) {
-    std::string inc = Write("inc.cfg", "# own count\n(x Integer 9)\n)\n(never Integer 0)\n");
-    std::string bad = Write("bad.cfg", "# 1\n# 2\n(oops)\n");
+    std::string inc = oDir.Write("inc.cfg", "# own count\n(x Integer 9)\n)\n(never Integer 0)\n");
+    std::string bad = oDir.Write("bad.cfg", "# 1\n# 2\n(oops)\n");
     PTNSubTree tree("root");
-    ReadFile(tree,
-             Write("main.cfg", "(a Integer 1)\n(@include " + inc + ")\n(s SubTree\n  (@Include " +
-                                   inc + ")\n  (y Integer 2)\n)\n(b Integer 3)\n"));
+    ReadFile(tree, oDir.Write("main.cfg", "(a Integer 1)\n(@include " + inc +
+                                              ")\n(s SubTree\n  (@Include " + inc +
+                                              ")\n  (y Integer 2)\n)\n(b Integer 3)\n"));
     EXPECT_EQ(Shape(&tree), "a x s{x y} b");
     EXPECT_TRUE(gReports.empty());
 
     // A corrupt line at the outermost level of an included file reaches the
     // host when the directive is outside every subtree, naming that file...
     PTNSubTree failed("root");
-    EXPECT_THROW(ReadFile(failed, Write("top.cfg",
-                                        "(a Integer 1)\n(@include " + bad + ")\n(b Integer 2)\n")),
+    EXPECT_THROW(ReadFile(failed, oDir.Write("top.cfg", "(a Integer 1)\n(@include " + bad +
+                                                            ")\n(b Integer 2)\n")),
                  tzn::Exception);
     EXPECT_EQ(Shape(&failed), "a");
     EXPECT_EQ(gReports, Texts{"-1/1 Corrupt file " + bad + "\n at line 3 ... missing tokens.\n"});
     // ...and stops the read quietly when it is inside one.
     PTNSubTree quiet("root");
-    ReadFile(quiet, Write("nested.cfg",
-                          "(s SubTree\n(@include " + bad + ")\n(c Integer 1)\n)\n(d Integer 2)\n"));
+    ReadFile(quiet, oDir.Write("nested.cfg", "(s SubTree\n(@include " + bad +
+                                                 ")\n(c Integer 1)\n)\n(d Integer 2)\n"));
     EXPECT_EQ(Shape(&quiet), "s{}");
     // An error inside a subtree of the included file ends only that file.
-    std::string inner = Write("inner.cfg", "(t SubTree\n(oops)\n)\n(lost Integer 1)\n");
+    std::string inner = oDir.Write("inner.cfg", "(t SubTree\n(oops)\n)\n(lost Integer 1)\n");
     EXPECT_EQ(Shape(Read("(@include " + inner + ")\n(z Integer 1)\n").get()), "t{} z");
 }
 
 TEST_F(ReaderTest, MissingIncludesAndSearchPath) {
-    setenv("READER_TEST_DIR", oDir.c_str(), 1);
+    setenv("READER_TEST_DIR", oDir.Root().c_str(), 1);
     auto tree = Read(
         "(a Integer 1)\n! c\n(@include $READER_TEST_DIR/none.cfg)\n"
         "(@TRY_INCLUDE ${READER_TEST_DIR}/none.cfg)\n(b Integer 2)\n");
     EXPECT_EQ(Shape(tree.get()), "a b");
-    EXPECT_EQ(gReports, Texts{"3/2 Unable to locate file '" + (oDir / "none.cfg").string() +
+    EXPECT_EQ(gReports, Texts{"3/2 Unable to locate file '" + oDir.Path("none.cfg") +
                               "'\nrequested in @include directive\non line 3 of file "
                               "'Memory'.\nIgnoring.\n"});
 
     // Relative names are searched in the "etc" list first, then "pro".
-    Write("etc/both.cfg", "(fromEtc Integer 1)\n");
-    Write("pro/both.cfg", "(fromPro Integer 1)\n");
-    Write("pro/only.cfg", "(onlyPro Integer 1)\n");
-    setenv(DWX_ETC_PATH_VARIABLE, (oDir / "etc").c_str(), 1);
-    setenv(DWX_PRO_PATH_VARIABLE, (oDir / "pro").c_str(), 1);
+    oDir.Write("etc/both.cfg", "(fromEtc Integer 1)\n");
+    oDir.Write("pro/both.cfg", "(fromPro Integer 1)\n");
+    oDir.Write("pro/only.cfg", "(onlyPro Integer 1)\n");
+    setenv(DWX_ETC_PATH_VARIABLE, oDir.Path("etc").c_str(), 1);
+    setenv(DWX_PRO_PATH_VARIABLE, oDir.Path("pro").c_str(), 1);
     EXPECT_EQ(Shape(Read("(@include both.cfg)\n(@include only.cfg)\n").get()), "fromEtc onlyPro");
     EXPECT_EQ(gReports.size(), 1u);
 }
 
 // Diamonds and longer cycles are in the robustness tests.
 TEST_F(ReaderTest, IncludeCycleAndDepthLimit) {
-    std::string self = (oDir / "self.cfg").string();
+    std::string self = oDir.Path("self.cfg");
     PTNSubTree tree("root");
-    ReadFile(tree, Write("self.cfg", "(s Integer 1)\n(@include " + self + ")\n(t Integer 2)\n"));
+    ReadFile(tree,
+             oDir.Write("self.cfg", "(s Integer 1)\n(@include " + self + ")\n(t Integer 2)\n"));
     EXPECT_EQ(Shape(&tree), "s t");
     EXPECT_EQ(gReports, Texts{"3/2 Include cycle: file '" + self +
                               "'\nrequested in @include directive\non line 2 of file '" + self +
                               "'\nis already being read.\nIgnoring.\n"});
 
     // A chain of 70 distinct files: 64 nested includes are read.
-    auto chain = [this](int i) { return (oDir / ("chain" + std::to_string(i) + ".cfg")).string(); };
+    auto chain = [](int i) { return "chain" + std::to_string(i) + ".cfg"; };
     for (int i = 0; i < 70; ++i) {
-        Write(chain(i),
-              "(n" + std::to_string(i) + " Integer 1)\n(@include " + chain(i + 1) + ")\n");
+        oDir.Write(chain(i), "(n" + std::to_string(i) + " Integer 1)\n(@include " +
+                                 oDir.Path(chain(i + 1)) + ")\n");
     }
     gReports.clear();
     PTNSubTree deep("root");
-    ReadFile(deep, chain(0));
+    ReadFile(deep, oDir.Path(chain(0)));
     EXPECT_EQ(deep.GetChildren()->GetCount(), 65);
     EXPECT_NE(deep.GetChild("n64"), nullptr);
     ASSERT_EQ(gReports.size(), 1u);
-    EXPECT_EQ(gReports[0].find("3/2 Include depth limit of 64 reached: file '" + chain(65)), 0u);
+    EXPECT_EQ(
+        gReports[0].find("3/2 Include depth limit of 64 reached: file '" + oDir.Path(chain(65))),
+        0u);
 }
 
 TEST_F(ReaderTest, IncludeTrace) {
-    std::string directive = "@Include " + Write("inc.cfg", "(x Integer 9)\n");
+    std::string directive = "@Include " + oDir.Write("inc.cfg", "(x Integer 9)\n");
     std::string text = "(" + directive + ")\n";
     char* buffer = nullptr;
     size_t size = 0;
@@ -445,7 +405,7 @@ TEST_F(ReaderTest, WriteThenReadEveryClass) {
     config.AddChild(new PTNChar("tab", '\t'));  // breaks its line: read stops here
     config.AddChild(new PTNInteger("lost", 1));
 
-    std::string path = (oDir / "tree.cfg").string();
+    std::string path = oDir.Path("tree.cfg");
     FILE* out = fopen(path.c_str(), "w");
     config.WriteToFile(out);
     fclose(out);

@@ -2,6 +2,9 @@
 // missing files; a 1 MB line, a million siblings and nesting far deeper than
 // any configuration. Whatever happens is reported through the error handler,
 // everything read before a problem stays, and nothing crashes.
+#include "scratch_dir.h"
+#include "tree_test_util.h"
+
 #include <dwxcore/dwxparse.h>
 #include <services/utilhub.h>
 
@@ -12,16 +15,12 @@
 #include <strings.h>
 #include <unistd.h>
 
-#include <filesystem>
-#include <fstream>
 #include <map>
 #include <memory>
 #include <string>
 #include <vector>
 
 namespace {
-
-namespace fs = std::filesystem;
 
 struct Report {
     int code;
@@ -38,46 +37,12 @@ class RobustnessTest : public ::testing::Test {
     void SetUp() override {
         gReports.clear();
         oPrevious = IMPSetErrorHandler(Capture);
-        oDir = fs::temp_directory_path() /
-               ("robustness_test_" + std::to_string(::getpid()) + "_" +
-                ::testing::UnitTest::GetInstance()->current_test_info()->name());
-        fs::create_directories(oDir);
     }
-    void TearDown() override {
-        IMPSetErrorHandler(oPrevious);
-        fs::remove_all(oDir);
-    }
-    std::string Path(const std::string& name) const { return (oDir / name).string(); }
-    std::string Write(const std::string& name, const std::string& text) const {
-        std::ofstream(Path(name), std::ios::binary) << text;
-        return Path(name);
-    }
-    // Reads a file opened the way hosts open it.
-    void ReadFile(PTNSubTree& tree, const std::string& path) const {
-        FILE* stream = DKOpen(path.c_str(), 4, "r");
-        ASSERT_NE(stream, nullptr);
-        tree.BuildFromFile(stream);
-        DKClose(stream);
-    }
+    void TearDown() override { IMPSetErrorHandler(oPrevious); }
 
     IMPErrorHandler oPrevious = nullptr;
-    fs::path oDir;
+    ScratchDir oDir;
 };
-
-// The names of the children, joined with blanks; subtrees as name{...}.
-std::string Shape(const PTNSubTree* tree) {
-    std::string shape;
-    DWXIter it(tree->GetChildren());
-    for (DWXObject* object = it.Current(); object; object = it.Next()) {
-        auto* node = static_cast<DWXParseTreeNode*>(object);
-        shape += shape.empty() ? "" : " ";
-        shape += node->GetName();
-        if (auto* sub = dynamic_cast<PTNSubTree*>(node)) {
-            shape += "{" + Shape(sub) + "}";
-        }
-    }
-    return shape;
-}
 
 // The number of subtrees on the path that always takes the first subtree child.
 int Depth(const PTNSubTree* tree) {
@@ -103,13 +68,13 @@ TEST_F(RobustnessTest, IncludeChainOfAHundredFiles) {
     for (int i = 0; i < files; ++i) {
         std::string text = "(n" + std::to_string(i) + " Integer " + std::to_string(i) + ")\n";
         if (i + 1 < files) {
-            text += "(@include " + Path("chain" + std::to_string(i + 1) + ".cfg") + ")\n";
+            text += "(@include " + oDir.Path("chain" + std::to_string(i + 1) + ".cfg") + ")\n";
         }
         text += "(t" + std::to_string(i) + " Integer " + std::to_string(i) + ")\n";
-        Write("chain" + std::to_string(i) + ".cfg", text);
+        oDir.Write("chain" + std::to_string(i) + ".cfg", text);
     }
     PTNSubTree tree("root");
-    ReadFile(tree, Path("chain0.cfg"));
+    ReadFile(tree, oDir.Path("chain0.cfg"));
 
     // Files 0 to read - 1 were read; a depth limit, if it stops the chain,
     // is reported once, naming the first file left out.
@@ -211,7 +176,7 @@ TEST_F(RobustnessTest, IncludeCyclesDiamondsAndMissingFiles) {
                 strncasecmp(name.c_str(), "try_include", 11) == 0) {
                 continue;  // a directive, not a file
             }
-            std::string path = name == "." ? oDir.string() : Path(name + ".cfg");
+            std::string path = name == "." ? oDir.Root() : oDir.Path(name + ".cfg");
             text.replace(at, end - at, path);
             at += path.size() - 1;
         }
@@ -221,10 +186,10 @@ TEST_F(RobustnessTest, IncludeCyclesDiamondsAndMissingFiles) {
         SCOPED_TRACE(c.name);
         gReports.clear();
         for (const auto& file : c.files) {
-            Write(file.first + ".cfg", resolve(file.second));
+            oDir.Write(file.first + ".cfg", resolve(file.second));
         }
         PTNSubTree tree("root");
-        ReadFile(tree, Path(std::string(c.start) + ".cfg"));
+        ReadFile(tree, oDir.Path(std::string(c.start) + ".cfg"));
         EXPECT_EQ(Shape(&tree), c.shape);
         ASSERT_EQ(gReports.size(), c.reports.size());
         for (size_t i = 0; i < c.reports.size(); ++i) {
@@ -233,8 +198,7 @@ TEST_F(RobustnessTest, IncludeCyclesDiamondsAndMissingFiles) {
             EXPECT_NE(gReports[i].message.find(resolve(c.reports[i])), std::string::npos)
                 << gReports[i].message;
         }
-        fs::remove_all(oDir);
-        fs::create_directories(oDir);
+        oDir.Clear();
     }
 }
 

@@ -1,5 +1,7 @@
 // The subtree: ownership, lookups and typed readers, deep copies, and the
 // merge under an exception list.
+#include "tree_test_util.h"
+
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 
@@ -18,11 +20,6 @@ struct CountingNode : PTNInteger {
     ~CountingNode() override { ++destroyed; }
 };
 int CountingNode::destroyed = 0;
-
-std::string Text(const DWXParseTreeNode& node) {
-    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
-    return text.get();
-}
 
 template <class Tree>
 Tree* With(Tree* tree, std::initializer_list<DWXParseTreeNode*> children) {

@@ -1,3 +1,5 @@
+#include "scratch_dir.h"
+
 #include <services/utilhub.h>
 
 #include <gtest/gtest.h>
@@ -9,8 +11,6 @@
 #include <time.h>
 #include <unistd.h>
 
-#include <filesystem>
-#include <fstream>
 #include <string>
 #include <vector>
 
@@ -45,17 +45,6 @@ Lines ReadLines(TextLineReader& reader, Open open) {
     EXPECT_EQ(reader.Failed(), 0);
     return lines;
 }
-
-// A scratch directory, removed with its content at the end of the test.
-struct TempDir {
-    std::string path = "/tmp/utilhub_test_XXXXXX";
-    TempDir() { EXPECT_NE(mkdtemp(&path[0]), nullptr); }
-    ~TempDir() { std::filesystem::remove_all(path); }
-    std::string Write(const std::string& name, const std::string& content) const {
-        std::ofstream(path + "/" + name, std::ios::binary) << content;
-        return path + "/" + name;
-    }
-};
 
 // White space splits outside quoted runs; delimiters split anywhere and drop empty pieces.
 TEST(UtilhubTokenize, QuotedRunsAndDelimiters) {
@@ -149,7 +138,7 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
         // A file line ends at its first NUL byte, as its list entry reads.
         {std::string("a\0b\nc\0\r\nd", 9), {"a", "c", "d"}},
     };
-    TempDir dir;
+    ScratchDir dir;
     TextLineReader reader;  // reused across files and buffers
     for (const Case& c : cases) {
         std::string path = dir.Write("lines.txt", c.text);
@@ -195,13 +184,13 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
 }
 
 TEST(UtilhubFiles, OnlyReadableRegularFilesPassTheCheck) {
-    TempDir dir;
+    ScratchDir dir;
     std::string file = dir.Write("plain.cfg", "x\n");
-    std::string fifo = dir.path + "/pipe";
+    std::string fifo = dir.Path("pipe");
     ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
     EXPECT_EQ(DKCheck(file.c_str()), 1);
-    for (const std::string& path : {dir.path, std::string("/dev/null"), std::string("/dev/zero"),
-                                    fifo, dir.path + "/missing", std::string()}) {
+    for (const std::string& path : {dir.Root(), std::string("/dev/null"), std::string("/dev/zero"),
+                                    fifo, dir.Path("missing"), std::string()}) {
         EXPECT_EQ(DKCheck(path.c_str()), 0) << path;
         EXPECT_EQ(TextFileToStringList(path.c_str()), nullptr) << path;
         TextLineReader reader;
@@ -216,9 +205,9 @@ TEST(UtilhubFiles, OnlyReadableRegularFilesPassTheCheck) {
 }
 
 TEST(UtilhubFiles, StreamsRememberTheirPath) {
-    TempDir dir;
+    ScratchDir dir;
     std::string path = dir.Write("read.cfg", "first\r\n\nlast");
-    EXPECT_EQ(DKOpen((dir.path + "/missing").c_str(), 4, "r"), nullptr);
+    EXPECT_EQ(DKOpen(dir.Path("missing").c_str(), 4, "r"), nullptr);
     FILE* stream = DKOpen(path.c_str(), 4, "r");
     ASSERT_NE(stream, nullptr);
     const char* name = fp2filename(stream);
@@ -239,23 +228,23 @@ TEST(UtilhubFiles, StreamsRememberTheirPath) {
 }
 
 TEST(UtilhubFiles, FindFileSearchesTheDirectoryLists) {
-    TempDir first, second;
+    ScratchDir first, second;
     second.Write("both.cfg", "");
     first.Write("both.cfg", "");
     second.Write("late.cfg", "");
-    ASSERT_EQ(mkdir((first.path + "/late.cfg").c_str(), 0700), 0);  // a directory is no match
+    ASSERT_EQ(mkdir(first.Path("late.cfg").c_str(), 0700), 0);  // a directory is no match
 
-    setenv(DWX_ETC_PATH_VARIABLE, ("/nonexistent::" + first.path + ":" + second.path + "/").c_str(),
-           1);
-    setenv(DWX_PRO_PATH_VARIABLE, second.path.c_str(), 1);
+    setenv(DWX_ETC_PATH_VARIABLE,
+           ("/nonexistent::" + first.Root() + ":" + second.Root() + "/").c_str(), 1);
+    setenv(DWX_PRO_PATH_VARIABLE, second.Root().c_str(), 1);
     struct Case {
         const char* key;
         const char* name;
         std::string expected;  // empty: not found
     } cases[] = {
-        {"etc", "both.cfg", first.path + "/both.cfg"},
-        {"etc", "late.cfg", second.path + "/late.cfg"},
-        {"pro", "both.cfg", second.path + "/both.cfg"},
+        {"etc", "both.cfg", first.Path("both.cfg")},
+        {"etc", "late.cfg", second.Path("late.cfg")},
+        {"pro", "both.cfg", second.Path("both.cfg")},
         {"etc", "absent.cfg", ""},
         {"bin", "both.cfg", ""},
         {"etc", "", ""},

@@ -1,5 +1,6 @@
 // The writer: exact line formats and indents, as lists, a buffer and a stream.
 #include "container_test_util.h"
+#include "tree_test_util.h"
 
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
@@ -22,11 +23,6 @@ std::string Lines(const PTNSubTree& tree, int level = 0) {
     }
     DestroyStringList(list);
     return lines;
-}
-
-std::string Text(const DWXParseTreeNode& node) {
-    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
-    return text.get();
 }
 
 TEST(WriterTest, SubtreesAndIndents) {
