@@ -139,15 +139,20 @@ bool CleanBase64(const std::string& input, std::string& clean, std::string& erro
     return true;
 }
 
-}  // namespace
-
-int RunShow(const Arguments& args) {
+// Reads the file named by the first operand and prints it with `print`.
+int PrintTreeFile(const Arguments& args, void (*print)(FILE*, const PTNSubTree&)) {
     TreeFile file;
     if (!ReadTreeFile(args.Positional()[1].c_str(), file)) {
         return kExitData;
     }
-    WriteTopLevel(stdout, *file.root);
+    print(stdout, *file.root);
     return DataResult(file);
+}
+
+}  // namespace
+
+int RunShow(const Arguments& args) {
+    return PrintTreeFile(args, WriteTopLevel);
 }
 
 int RunCheck(const Arguments& args) {
@@ -249,12 +254,7 @@ int RunMerge(const Arguments& args) {
 }
 
 int RunJson(const Arguments& args) {
-    TreeFile file;
-    if (!ReadTreeFile(args.Positional()[1].c_str(), file)) {
-        return kExitData;
-    }
-    WriteJson(stdout, *file.root);
-    return DataResult(file);
+    return PrintTreeFile(args, WriteJson);
 }
 
 int RunBase64(const Arguments& args) {
