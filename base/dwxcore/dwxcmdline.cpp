@@ -149,12 +149,12 @@ int DWXCmdLine::Count(const char* name) const {
 
 int DWXCmdLine::GetInt(const char* name, int defaultValue, int index) const {
     const char* value = ValueAt(name, index);
-    return value ? atoi(value) : defaultValue;
+    return value ? TZN_atoi(value) : defaultValue;
 }
 
 float DWXCmdLine::GetFloat(const char* name, float defaultValue, int index) const {
     const char* value = ValueAt(name, index);
-    return value ? static_cast<float>(atof(value)) : defaultValue;
+    return value ? static_cast<float>(TZN_atof(value)) : defaultValue;
 }
 
 const char* DWXCmdLine::GetString(const char* name, const char* defaultValue, int index) const {

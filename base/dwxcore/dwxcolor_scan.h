@@ -1,7 +1,7 @@
 // Private to the colour sources: reading colour components from text.
 #pragma once
 
-#include <stdlib.h>
+#include <services/rtprim.h>
 
 namespace dwxcolor_detail {
 
@@ -9,7 +9,7 @@ namespace dwxcolor_detail {
 // (white space, sign, digits; 0 without digits), but defined for numbers beyond
 // the range of int, where atoi is not.
 inline int ComponentOf(const char* text) {
-    return static_cast<unsigned char>(strtoll(text, nullptr, 10));
+    return static_cast<unsigned char>(TZN_strtoll(text, nullptr, 10));
 }
 
 }  // namespace dwxcolor_detail

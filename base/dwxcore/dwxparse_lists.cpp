@@ -75,13 +75,13 @@ char* JoinElements(int count, const T* values, Put put) {
 }
 
 int ReadInteger(const char* word) {
-    return atoi(word);
+    return TZN_atoi(word);
 }
 
 // atof truncated toward zero; values beyond the range of int are clamped
 // (converting them directly would be undefined) and NaN gives 0.
 int ReadTruncatedInteger(const char* word) {
-    const double value = atof(word);
+    const double value = TZN_atof(word);
     if (isnan(value)) {
         return 0;
     }
@@ -95,7 +95,7 @@ int ReadTruncatedInteger(const char* word) {
 }
 
 double ReadDouble(const char* word) {
-    return atof(word);
+    return TZN_atof(word);
 }
 
 char* PutWidenedInteger(char* out, int value) {

@@ -152,7 +152,7 @@ PTNInteger::PTNInteger(const char* name, int value) : DWXParseTreeNode(name), nV
 PTNInteger::~PTNInteger() {}
 
 void PTNInteger::SetAsString(const char* text) {
-    nValue = atoi(TextOrEmpty(text));
+    nValue = TZN_atoi(TextOrEmpty(text));
 }
 
 const char* PTNInteger::GetClassName() const {
@@ -181,7 +181,7 @@ PTNFloat::PTNFloat(const char* name, float value) : DWXParseTreeNode(name), fVal
 PTNFloat::~PTNFloat() {}
 
 void PTNFloat::SetAsString(const char* text) {
-    fValue = static_cast<float>(atof(TextOrEmpty(text)));
+    fValue = static_cast<float>(TZN_atof(TextOrEmpty(text)));
 }
 
 const char* PTNFloat::GetClassName() const {
@@ -210,7 +210,7 @@ PTNDouble::PTNDouble(const char* name, double value) : DWXParseTreeNode(name), d
 PTNDouble::~PTNDouble() {}
 
 void PTNDouble::SetAsString(const char* text) {
-    dValue = atof(TextOrEmpty(text));
+    dValue = TZN_atof(TextOrEmpty(text));
 }
 
 const char* PTNDouble::GetClassName() const {

@@ -3,6 +3,8 @@
 // the library.
 #pragma once
 
+#include <services/rtprim.h>
+
 #include <stddef.h>
 #include <stdint.h>
 #include <stdlib.h>
@@ -110,12 +112,12 @@ inline int ScanInteger(const char* text) {
     int digits = 0;
     for (; *p >= '0' && *p <= '9'; ++p) {
         if (++digits > 9) {
-            return atoi(text);
+            return TZN_atoi(text);
         }
         value = value * 10 + (*p - '0');
     }
     if (digits == 0 || *p != '\0') {
-        return atoi(text);
+        return TZN_atoi(text);
     }
     return negative ? -value : value;
 }
@@ -139,7 +141,7 @@ inline double ScanDouble(const char* text) {
     for (;; ++p) {
         if (*p >= '0' && *p <= '9') {
             if (++digits > 15) {
-                return atof(text);
+                return TZN_atof(text);
             }
             mantissa = mantissa * 10 + (*p - '0');
             fraction += point ? 1 : 0;
@@ -150,7 +152,7 @@ inline double ScanDouble(const char* text) {
         }
     }
     if (digits == 0 || *p != '\0') {
-        return atof(text);
+        return TZN_atof(text);
     }
     double value = static_cast<double>(negative ? -mantissa : mantissa);
     if (negative && mantissa == 0) {

@@ -348,7 +348,7 @@ DWXString& DWXString::MakeLower() {
 }
 
 int DWXString::ToInt() const {
-    return atoi(pchData);
+    return TZN_atoi(pchData);
 }
 
 double DWXString::ToDouble() const {

@@ -1,5 +1,6 @@
 #include <services/rtprim.h>
 
+#include <locale.h>
 #include <stdarg.h>
 #include <stdio.h>
 #include <stdlib.h>
@@ -185,6 +186,54 @@ char* LCaseString(char* text) {
     return text;
 }
 
+namespace {
+
+// The "C" locale, made once and kept for the life of the process, so that
+// number reading never follows the host's setlocale.
+#if defined(_WIN32)
+_locale_t CLocale() {
+    static const _locale_t c = _create_locale(LC_ALL, "C");
+    return c;
+}
+#define DWX_STRTOD_L _strtod_l
+#define DWX_STRTOL_L _strtol_l
+#define DWX_STRTOLL_L _strtoi64_l
+#else
+locale_t CLocale() {
+    static const locale_t c = newlocale(LC_ALL_MASK, "C", static_cast<locale_t>(nullptr));
+    return c;
+}
+#define DWX_STRTOD_L strtod_l
+#define DWX_STRTOL_L strtol_l
+#define DWX_STRTOLL_L strtoll_l
+#endif
+
+const char* OrEmpty(const char* text) {
+    return text ? text : "";
+}
+
+}  // namespace
+
+double TZN_strtod(const char* text, char** end) {
+    return DWX_STRTOD_L(OrEmpty(text), end, CLocale());
+}
+
+long TZN_strtol(const char* text, char** end, int base) {
+    return DWX_STRTOL_L(OrEmpty(text), end, base, CLocale());
+}
+
+long long TZN_strtoll(const char* text, char** end, int base) {
+    return DWX_STRTOLL_L(OrEmpty(text), end, base, CLocale());
+}
+
+double TZN_atof(const char* text) {
+    return TZN_strtod(text, nullptr);
+}
+
+int TZN_atoi(const char* text) {
+    return static_cast<int>(TZN_strtol(text, nullptr, 10));
+}
+
 double ScanDouble(const char* text, int length) {
     if (!text || length <= 0) {
         return 0.0;
@@ -196,7 +245,7 @@ double ScanDouble(const char* text, int length) {
     char* copy = size < sizeof small ? small : static_cast<char*>(HMalloc(size + 1));
     memcpy(copy, text, size);
     copy[size] = '\0';
-    double value = strtod(copy, nullptr);
+    double value = TZN_strtod(copy, nullptr);
     if (copy != small) {
         free(copy);
     }

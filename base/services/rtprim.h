@@ -45,8 +45,17 @@ DWXSERVICES_API RTMessageCatalogue RTSetMessageCatalogue(RTMessageCatalogue cata
 DWXSERVICES_API char* UCaseString(char* text);
 DWXSERVICES_API char* LCaseString(char* text);
 
+// Numbers read exactly as the "C" locale reads them, whatever locale the host
+// has set: the rules of strtod, strtol, strtoll, atof and atoi otherwise (leading
+// white space, sign, exponent, the longest valid prefix). Null reads as "".
+DWXSERVICES_API double TZN_strtod(const char* text, char** end);
+DWXSERVICES_API long TZN_strtol(const char* text, char** end, int base);
+DWXSERVICES_API long long TZN_strtoll(const char* text, char** end, int base);
+DWXSERVICES_API double TZN_atof(const char* text);
+DWXSERVICES_API int TZN_atoi(const char* text);
+
 // The number at the start of the first `length` characters of `text` (strtod
-// syntax, leading white space allowed); 0.0 when there is none.
+// syntax in the "C" locale, leading white space allowed); 0.0 when there is none.
 DWXSERVICES_API double ScanDouble(const char* text, int length);
 
 // An in-place sort with the contract of qsort.

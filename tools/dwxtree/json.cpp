@@ -176,7 +176,7 @@ std::string JsonNumber(double value) {
     char text[40];
     for (int digits = 1; digits <= 17; ++digits) {
         snprintf(text, sizeof text, "%.*g", digits, value);
-        if (strtod(text, nullptr) == value) {
+        if (TZN_strtod(text, nullptr) == value) {
             break;
         }
     }
