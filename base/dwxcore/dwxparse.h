@@ -504,8 +504,6 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     }
 
     // The children in order, for range-for: for (DWXParseTreeNode* c : tree).
-    // Adding children during the walk is allowed; what the walk then sees
-    // follows the array's walk.
     DWXRangeIter<DWXParseTreeNode> begin() const {
         return DWXRangeIter<DWXParseTreeNode>(&oChildren);
     }
