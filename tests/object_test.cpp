@@ -149,4 +149,30 @@ TEST(ObjectTest, DefaultEmptyStopsWhenRemoveRefuses) {
     EXPECT_EQ(host.GetCount(), 1);
 }
 
+TEST(ObjectTest, RangeForVisitsWhatDWXIterVisits) {
+    CountingObject a, b, c, d;
+    DWXArray array, empty;
+    DWXPackedArray packed;
+    DWXBag bag;
+    DWXLinkedList list;
+    HostContainer host;
+    for (DWXContainer* container :
+         std::vector<DWXContainer*>{&array, &packed, &bag, &list, &host}) {
+        AddAll(*container, {&a, &b, &c, &d});
+        container->Remove(&b);  // a hole in the array, a move in the others
+    }
+    AddAll(bag, {nullptr, &b});  // a stored null ends a walk
+    list.Insert(nullptr, list.Find(&c));
+    for (const DWXContainer* container :
+         std::vector<const DWXContainer*>{&array, &packed, &bag, &list, &host, &empty}) {
+        Members visited;
+        for (DWXObject* o : *container) {
+            visited.push_back(o);
+        }
+        EXPECT_EQ(visited, Walk(*container)) << container->GetClassName();
+        EXPECT_EQ(container->begin() == container->end(), visited.empty());
+    }
+    EXPECT_EQ(std::count(array.begin(), array.end(), &c), 1);
+}
+
 }  // namespace

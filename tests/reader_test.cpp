@@ -421,4 +421,139 @@ TEST_F(ReaderTest, WriteThenReadEveryClass) {
     ASSERT_EQ(gReports.size(), 1u);  // the tab line
 }
 
+// Reads with a log ----------------------------------------------------------
+
+// Each entry as "code/severity file:line".
+Texts Entries(const std::vector<PTNReadReport>& reports) {
+    Texts texts;
+    for (const PTNReadReport& r : reports) {
+        texts.push_back(std::to_string(r.code) + "/" + std::to_string(r.severity) + " " + r.file +
+                        ":" + std::to_string(r.line));
+    }
+    return texts;
+}
+
+PTNReadLog ReadLogged(PTNSubTree& tree, const std::string& path) {
+    PTNReadLog log;
+    FILE* stream = DKOpen(path.c_str(), 4, "r");
+    EXPECT_NO_THROW(tree.BuildFromFile(stream, &log));
+    DKClose(stream);
+    return log;
+}
+
+// A node's line and the chain of files that reached it, "line file@includedAtLine ...".
+std::string Where(const DWXParseTreeNode* node) {
+    std::string text = std::to_string(node->GetSourceLine());
+    for (const PTNSourceFile* file = node->GetSourceFile(); file; file = file->includedBy) {
+        const char* slash = strrchr(file->name, '/');
+        text += std::string(" ") + (slash ? slash + 1 : file->name) + "@" +
+                std::to_string(file->includedAtLine);
+    }
+    return text;
+}
+
+TEST_F(ReaderTest, LogTakesReportsAndWarningsWithTheirLines) {
+    struct Row {
+        const char* text;
+        Texts reports, warnings;
+    } rows[] = {
+        {"(t SubTree\n(w Integer -2147483648)\n(b Bool yes)\n(s String \"x y\" )\n"
+         "(d Double -2.5e3)\n(e Double .5)\n(k Integer +7)\n)\n",
+         {},
+         {}},
+        {"(a Integer 1)\n\n(corrupt)\n(b Integer 2)\n", {"-1/1 Memory:3"}, {}},
+        {"! c\n(port Integr 8080)\n(f Float 1.5)\n", {}, {"101/3 Memory:2", "101/3 Memory:3"}},
+        {"(a Integer 1)\n)\n(b Integer 2)\n", {}, {"102/3 Memory:2"}},
+        // The blank makes config the keyword; the closing line then ends the read.
+        {"( config SubTree\n(x Integer 1)\n)\n(y Integer 2)\n",
+         {},
+         {"103/3 Memory:1", "102/3 Memory:3"}},
+        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n",
+         {},
+         {"104/3 Memory:1", "104/3 Memory:2", "104/3 Memory:3"}},
+        {"(d Double 1.5x)\n(f Double abc)\n", {}, {"105/3 Memory:1", "105/3 Memory:2"}},
+        {"#\n\n(s String \"a\" \"b\")\n", {}, {"106/3 Memory:3"}},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.text);
+        PTNSubTree logged("root"), plain("root");
+        PTNReadLog log;
+        EXPECT_NO_THROW(logged.BuildFromString(row.text, &log));
+        EXPECT_TRUE(gReports.empty());
+        EXPECT_EQ(Entries(log.Reports()), row.reports);
+        EXPECT_EQ(Entries(log.Warnings()), row.warnings);
+        EXPECT_EQ(log.Ok(), row.reports.empty());
+        // Without a log: the handler and the exception as always, no warnings, the same tree.
+        try {
+            plain.BuildFromString(row.text, nullptr);
+        } catch (const tzn::Exception&) {
+        }
+        EXPECT_EQ(gReports.size(), row.reports.size());
+        EXPECT_EQ(Shape(&logged, true), Shape(&plain, true));
+        gReports.clear();
+    }
+}
+
+TEST_F(ReaderTest, LogNamesIncludedFilesAndTheirOwnLines) {
+    std::string inc =
+        oDir.Write("inc.cfg", "! 1\n(x Integr 5)\n(s SubTree\n(bad)\n)\n(lost Integer 1)\n");
+    std::string main = oDir.Write("main.cfg", "(a Integer 1)\n(@include " + inc + ")\n(@include " +
+                                                  oDir.Path("none.cfg") + ")\n(@include " + inc +
+                                                  ")\n(b Integer 2)\n");
+    PTNSubTree tree("root");
+    PTNReadLog log = ReadLogged(tree, main);
+    EXPECT_EQ(Shape(&tree), "a s{} s{} b");
+    EXPECT_EQ(Entries(log.Reports()),
+              (Texts{"-1/1 " + inc + ":4", "3/2 " + main + ":3", "-1/1 " + inc + ":4"}));
+    EXPECT_EQ(Entries(log.Warnings()), (Texts{"101/3 " + inc + ":2", "101/3 " + inc + ":2"}));
+    EXPECT_EQ(log.Files(), (Texts{main, inc}));  // once each, the starting file first
+    EXPECT_TRUE(gReports.empty());
+}
+
+TEST_F(ReaderTest, SourcesThroughIncludesCopiesMergesAndRereads) {
+    std::string leaf = oDir.Write("leaf.cfg", "! leaf\n(deep Integer 3)\n");
+    std::string mid = oDir.Write("mid.cfg", "(@include " + leaf + ")\n(mid Integer 2)\n");
+    std::string main =
+        oDir.Write("main.cfg", "(s SubTree\n(top Integer 1)\n(@include " + mid + ")\n)\n");
+    PTNSubTree tree("root"), again("root");
+    ReadFile(tree, main);
+    ReadFile(again, main);
+    DWXParseTreeNode* deep = tree.Find("s/deep");
+    EXPECT_EQ(Where(tree.Find("s")) + ", " + Where(tree.Find("s/mid")) + ", " + Where(deep),
+              "1 main.cfg@0, 2 mid.cfg@3 main.cfg@0, 2 leaf.cfg@1 mid.cfg@3 main.cfg@0");
+    EXPECT_EQ(tree.Find("s/mid")->GetSourceFile()->name, mid);
+    // Rereads and copies point to the very same records; merges keep the target's.
+    for (const char* path : {"s", "s/top", "s/mid", "s/deep"}) {
+        EXPECT_EQ(again.Find(path)->GetSourceFile(), tree.Find(path)->GetSourceFile()) << path;
+    }
+    std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
+    std::unique_ptr<DWXParseTreeNode> leafCopy(deep->Copy());
+    EXPECT_TRUE(copy->Find("s/deep")->GetSourceFile() == deep->GetSourceFile() &&
+                leafCopy->GetSourceFile() == deep->GetSourceFile());
+    EXPECT_EQ(Where(copy->Find("s")) + ", " + Where(leafCopy.get()),
+              Where(tree.Find("s")) + ", " + Where(deep));
+    auto other = Read("\n\n(s SubTree\n(deep Integer 30)\n)\n");
+    tree.SetFrom(other.get(), ExceptionList());
+    EXPECT_EQ(Text(*deep) + " " + Where(deep), "30 2 leaf.cfg@1 mid.cfg@3 main.cfg@0");
+    EXPECT_EQ(Where(other->Find("s/deep")), "4 Memory@0");
+    PTNInteger made("made", 1);
+    EXPECT_EQ(Where(&made), "0");  // not built by the reader
+}
+
+TEST_F(ReaderTest, IncludesNextToTheIncluder) {
+    std::string main = oDir.Write("conf/main.cfg", "(@include part.cfg)\n(m Integer 1)\n");
+    std::string part = oDir.Write("conf/part.cfg", "(near Integer 1)\n(@include sub/deep.cfg)\n");
+    std::string deep = oDir.Write("conf/sub/deep.cfg", "(deep Integer 1)\n(@include etc.cfg)\n");
+    std::string etc = oDir.Write("etc/etc.cfg", "(viaEtc Integer 1)\n");
+    setenv(DWX_ETC_PATH_VARIABLE, oDir.Path("etc").c_str(), 1);
+    for (bool on : {false, true, false}) {
+        PTNSubTree::SetIncludeSearchNextToIncluder(on);
+        PTNSubTree tree("root");
+        PTNReadLog log = ReadLogged(tree, main);
+        EXPECT_EQ(Shape(&tree), on ? "near deep viaEtc m" : "m");
+        EXPECT_EQ(log.Reports().size(), on ? 0u : 1u);
+        EXPECT_EQ(log.Files(), on ? (Texts{main, part, deep, etc}) : Texts{main});
+    }
+}
+
 }  // namespace

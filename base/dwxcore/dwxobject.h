@@ -8,7 +8,12 @@
 #include <stdint.h>
 #include <stdio.h>
 
+#include <cstddef>
+#include <iterator>
+
 class DWXIter;
+template <class T>
+class DWXRangeIter;
 
 // Root of every class with an identity. Deleting through a DWXObject* is safe.
 class DWXCORE_API DWXObject {
@@ -68,6 +73,11 @@ class DWXCORE_API DWXContainer : public DWXObject {
     // 1 unless a member that derives from DWXValidatable answers 0.
     virtual int Validate() const;
 
+    // For range-for: for (DWXObject* o : container) visits what a DWXIter
+    // visits, in the same order, and ends where it ends.
+    DWXRangeIter<DWXObject> begin() const;
+    DWXRangeIter<DWXObject> end() const;
+
     int GetCount() const { return nCount; }
     int IsEmpty() const { return nCount == 0 ? 1 : 0; }
 
@@ -124,6 +134,47 @@ class DWXCORE_API DWXIter : public DWXObject {
     DWXObject* poCurrent;
     int64_t nPosition;
 };
+
+// The walk of a DWXIter as an input iterator, for range-for and algorithms.
+// T is the class the container's owner guarantees for its members (members
+// are handed out with static_cast). The end iterator is default-constructed;
+// a walk is at its end when its DWXIter yields null.
+template <class T>
+class DWXRangeIter : private DWXIter {
+  public:
+    using iterator_category = std::input_iterator_tag;
+    using value_type = T*;
+    using difference_type = std::ptrdiff_t;
+    using pointer = T* const*;
+    using reference = T*;
+
+    DWXRangeIter() {}
+    // Stands on the first member of `container` (null: at the end).
+    explicit DWXRangeIter(const DWXContainer* container) : DWXIter(container) {}
+
+    T* operator*() const { return static_cast<T*>(poCurrent); }
+    DWXRangeIter& operator++() {
+        Next();
+        return *this;
+    }
+    // Two walks are equal when both are at their end, or when they stand on
+    // the same place of the same container.
+    bool operator==(const DWXRangeIter& other) const {
+        if (!poCurrent || !other.poCurrent) {
+            return !poCurrent && !other.poCurrent;
+        }
+        return poTarget == other.poTarget && nPosition == other.nPosition &&
+               poCurrent == other.poCurrent;
+    }
+    bool operator!=(const DWXRangeIter& other) const { return !(*this == other); }
+};
+
+inline DWXRangeIter<DWXObject> DWXContainer::begin() const {
+    return DWXRangeIter<DWXObject>(this);
+}
+inline DWXRangeIter<DWXObject> DWXContainer::end() const {
+    return DWXRangeIter<DWXObject>();
+}
 
 // Mix-in for objects that can check themselves. A member of a container takes
 // part in DWXContainer::Validate when its class derives from both DWXObject

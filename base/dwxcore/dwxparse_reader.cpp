@@ -22,10 +22,13 @@
 #include <stdlib.h>
 #include <string.h>
 
+#include <atomic>
 #include <filesystem>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <system_error>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -38,6 +41,41 @@ struct PTNStringAdopter {
         PTNString* node = new PTNString(name, nullptr);
         node->pcValue = owned.release();
         return node;
+    }
+};
+
+// Records where the reader built a node.
+struct PTNSourceSetter {
+    static void Set(DWXParseTreeNode* node, const PTNSourceFile* file, int line) {
+        node->poSource = file;
+        node->nSourceLine = line;
+    }
+};
+
+// The reader's entries in a PTNReadLog.
+struct PTNReadLogWriter {
+    static void Add(std::vector<PTNReadReport>& to, int code, int severity, const char* file,
+                    int line, const char* message) {
+        to.push_back(PTNReadReport{code, severity, file, line, message});
+    }
+    static void AddReport(PTNReadLog& log, int code, int severity, const char* file, int line,
+                          const char* message) {
+        Add(log.oReports, code, severity, file, line, message);
+    }
+    static void AddWarning(PTNReadLog& log, int code, const char* file, int line,
+                           const char* message) {
+        Add(log.oWarnings, code, 3, file, line, message);
+    }
+    static size_t ReportCount(const PTNReadLog& log) { return log.oReports.size(); }
+    // Lists `name` unless the file `canonical` is listed already.
+    static void AddFile(PTNReadLog& log, const char* name, const std::string& canonical) {
+        for (const std::string& known : log.oCanonicalFiles) {
+            if (known == canonical) {
+                return;
+            }
+        }
+        log.oCanonicalFiles.push_back(canonical);
+        log.oFiles.push_back(name);
     }
 };
 
@@ -66,6 +104,42 @@ using dwxparse_scan::ScanInteger;
 
 const char* SourceName(const char* fileName) {
     return fileName ? fileName : "Memory";
+}
+
+std::atomic<bool> gSearchNextToIncluder{false};
+
+// The source records, interned: one per (name, includedBy, includedAtLine),
+// made on first use and kept, like the table itself, for the whole process,
+// since every node read from a file points to its record.
+class SourceTable {
+  public:
+    const PTNSourceFile* Intern(const char* name, const PTNSourceFile* includedBy, int line) {
+        std::string key(name);
+        key.push_back('\0');
+        key.append(reinterpret_cast<const char*>(&includedBy), sizeof includedBy);
+        key.append(reinterpret_cast<const char*>(&line), sizeof line);
+        std::lock_guard<std::mutex> guard(oLock);
+        std::unique_ptr<Record>& record = oRecords[key];
+        if (!record) {
+            record = std::make_unique<Record>();
+            record->name = name;
+            record->file = PTNSourceFile{record->name.c_str(), includedBy, line};
+        }
+        return &record->file;
+    }
+
+  private:
+    struct Record {
+        std::string name;
+        PTNSourceFile file;
+    };
+    std::mutex oLock;
+    std::unordered_map<std::string, std::unique_ptr<Record>> oRecords;
+};
+
+const PTNSourceFile* InternSource(const char* fileName, const PTNSourceFile* includedBy, int line) {
+    static SourceTable* table = new SourceTable;
+    return table->Intern(SourceName(fileName), includedBy, line);
 }
 
 // The type keywords the reader builds nodes for.
@@ -190,14 +264,26 @@ class ChainEntry {
     bool bInclude;
 };
 
-// Reports a corrupt line. The report raises tzn::Exception; the throw below
-// only guards against a reporting service that returns after all.
-[[noreturn]] void ReportCorruptLine(const char* fileName, int line) {
-    const char* text =
-        MkName(_("Corrupt file %s\n at line %d ... missing tokens.\n"), SourceName(fileName), line);
-    std::string message(text);
-    IMPError(-1, 1, message.c_str());
-    throw tzn::Exception(-1, 1, message.c_str());
+// Whether a whole token is a number that atoi reads as written: an
+// optional sign and decimal digits within the range of int.
+bool IsIntegerText(const char* text) {
+    const char* p = text + (*text == '-' || *text == '+');
+    long long value = 0;
+    const char* digits = p;
+    for (; *p >= '0' && *p <= '9'; ++p) {
+        value = value * 10 + (*p - '0');
+        if (value > 2147483648LL) {
+            return false;
+        }
+    }
+    return p != digits && *p == '\0' && (*text == '-' || value <= 2147483647LL);
+}
+
+// Whether a whole token is a number that atof reads to its end.
+bool IsDoubleText(const char* text) {
+    char* end = nullptr;
+    TZN_strtod(text, &end);
+    return end != text && *end == '\0';
 }
 
 // The whole content of a stream from its start; the stream is left at its start.
@@ -239,23 +325,38 @@ class ListLines {
 // included, so that its scratch buffers are allocated once.
 class TreeReader {
   public:
-    // Reads from `lines` (a ListLines or a TextLineReader) into `root` until
-    // a closing line at the outermost level or the end of the lines. `count`
-    // is the line counter, updated on return. Returns false when an error
-    // inside a nested subtree ended the reading; an error at the outermost
-    // level propagates.
+    // With a log, reports go to it instead of IMPError and warnings are made.
+    explicit TreeReader(PTNReadLog* log) : poLog(log) {}
+
+    // Reads from `lines` (a ListLines or a TextLineReader) of the file
+    // `source` into `root` until a closing line at the outermost level or the
+    // end of the lines. `count` is the line counter, updated on return.
+    // Returns false when an error inside a nested subtree ended the reading;
+    // an error at the outermost level propagates as tzn::Exception.
     template <typename Lines>
-    bool Read(PTNSubTree* root, Lines& lines, const char* fileName, int& count);
+    bool Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* source, int& count);
+
+    // Every report of the reader passes here: to the log when there is one,
+    // else to IMPError. Severity 1 raises tzn::Exception either way.
+    void Report(int code, int severity, const char* fileName, int line, const char* message);
 
   private:
+    [[noreturn]] void ReportCorruptLine(const char* fileName, int line);
+    void Warn(int code, const char* fileName, int line, const char* message) {
+        PTNReadLogWriter::AddWarning(*poLog, code, SourceName(fileName), line, message);
+    }
+    // The warnings about a leaf line, which the log alone receives.
+    void CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, const char* fileName, int line);
     // Trims the line of `length` bytes at `line`, cuts a glued ')' and splits
     // it in place, from `first`, its first non-white character. Returns the
     // number of tokens; oTokens holds them, null-terminated.
     size_t Split(char* line, size_t length, char* first);
-    void BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount);
+    DWXParseTreeNode* BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind,
+                                size_t tokenCount);
     void Include(PTNSubTree* target, const char* directive, const char* file, int line,
-                 const char* fileName, bool required);
+                 const PTNSourceFile* source, bool required);
 
+    PTNReadLog* poLog;
     std::vector<char*> oTokens;  // the tokens of the current line, null-terminated
     std::vector<size_t> oLengths;
     std::string oJoined;
@@ -319,8 +420,65 @@ size_t TreeReader::Split(char* line, size_t length, char* first) {
     return count;
 }
 
+void TreeReader::Report(int code, int severity, const char* fileName, int line,
+                        const char* message) {
+    if (!poLog) {
+        IMPError(code, severity, message);
+    } else {
+        PTNReadLogWriter::AddReport(*poLog, code, severity, SourceName(fileName), line, message);
+    }
+    if (severity == 1) {
+        // Also a guard against a reporting service that returns after all.
+        throw tzn::Exception(code, severity, message);
+    }
+}
+
+void TreeReader::ReportCorruptLine(const char* fileName, int line) {
+    std::string message(MkName(_("Corrupt file %s\n at line %d ... missing tokens.\n"),
+                               SourceName(fileName), line));
+    Report(-1, 1, fileName, line, message.c_str());
+    throw tzn::Exception(-1, 1, message.c_str());
+}
+
+void TreeReader::CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, const char* fileName,
+                           int line) {
+    const char* value = oTokens[2];
+    switch (kind) {
+        case Keyword::Other:
+            if (!blankName) {
+                Warn(PTNReadLog::kUnknownKeyword, fileName, line,
+                     MkName(_("Type keyword '%s' builds no node; the line is skipped."),
+                            oTokens[1]));
+            }
+            break;
+        case Keyword::Integer:
+            if (!IsIntegerText(value)) {
+                Warn(PTNReadLog::kIntegerText, fileName, line,
+                     MkName(_("Integer value '%s' is not a number that fits in int; read as %d."),
+                            value, ScanInteger(value)));
+            }
+            break;
+        case Keyword::Double:
+            if (!IsDoubleText(value)) {
+                Warn(PTNReadLog::kDoubleText, fileName, line,
+                     MkName(_("Double value '%s' is not a number; read as %s."), value,
+                            MkName(ScanDouble(value), -1)));
+            }
+            break;
+        case Keyword::String:
+            if (tokenCount > 3 && oTokens[3][0] != ')') {
+                Warn(PTNReadLog::kJoinedString, fileName, line,
+                     _("String value of several tokens; they are joined without blanks."));
+            }
+            break;
+        default:
+            break;
+    }
+}
+
 template <typename Lines>
-bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int& count) {
+bool TreeReader::Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* source, int& count) {
+    const char* fileName = source->name;
     // The subtrees opened and not yet closed, each with the count at its
     // opening line: an error inside one ends the reading with that count, as
     // the level that holds it would have kept.
@@ -341,6 +499,10 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
             size_t tokenCount = Split(line, length, first);
             if (tokenCount > 0 && oTokens[0][0] == ')') {
                 if (open.empty()) {
+                    if (poLog) {
+                        Warn(PTNReadLog::kTopLevelClose, fileName, counter,
+                             _("Closing line outside every subtree; the rest is not read."));
+                    }
                     break;
                 }
                 open.pop_back();
@@ -351,19 +513,33 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
             }
             PTNSubTree* current = open.empty() ? root : open.back().first;
             const char* name = oTokens[0] + 1;
+            bool blankName = false;
+            if (poLog && oLengths[0] == 1) {
+                blankName = true;
+                Warn(PTNReadLog::kBlankAfterParen, fileName, counter,
+                     MkName(_("Blank between '(' and the name: the name is empty and '%s' is "
+                              "taken as the type keyword."),
+                            oTokens[1]));
+            }
             bool required = false;
             Keyword kind = Keyword::Other;
             if (IsDirective(name, required)) {
-                Include(current, name, oTokens[1], counter, fileName, required);
+                Include(current, name, oTokens[1], counter, source, required);
             } else if ((kind = Classify(oTokens[1], oLengths[1])) == Keyword::SubTree) {
                 auto subtree = std::make_unique<PTNSubTree>(name);
                 PTNSubTree* raw = subtree.get();
+                PTNSourceSetter::Set(raw, source, counter);
                 current->AddChild(subtree.release());
                 open.emplace_back(raw, counter);
             } else if (tokenCount < 3) {
                 ReportCorruptLine(fileName, counter);
             } else {
-                BuildLeaf(current, name, kind, tokenCount);
+                if (poLog) {
+                    CheckLeaf(kind, tokenCount, blankName, fileName, counter);
+                }
+                if (DWXParseTreeNode* leaf = BuildLeaf(current, name, kind, tokenCount)) {
+                    PTNSourceSetter::Set(leaf, source, counter);
+                }
             }
         } catch (const tzn::Exception&) {
             // Outside every subtree the exception is the caller's; inside
@@ -379,7 +555,9 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
     return true;
 }
 
-void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount) {
+// The new leaf, appended to `parent`; null for a keyword it builds nothing for.
+DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind,
+                                        size_t tokenCount) {
     // The value tokens run from the third token up to the first one that
     // begins with ')'.
     size_t valueEnd = 2;
@@ -443,19 +621,27 @@ void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, s
             break;
         }
         default:
-            return;  // a keyword the reader builds nothing for
+            return nullptr;  // a keyword the reader builds nothing for
     }
-    parent->AddChild(node.release());
+    DWXParseTreeNode* leaf = node.release();
+    parent->AddChild(leaf);
+    return leaf;
 }
 
 void TreeReader::Include(PTNSubTree* target, const char* directive, const char* file, int line,
-                         const char* fileName, bool required) {
+                         const PTNSourceFile* source, bool required) {
+    const char* fileName = source->name;
     if (tzn::tracer::Debugger::moDebugLevel != 0) {
         tzn::tracer::Debugger::Debug(
             tzn::tracer::Debugger::FormatString("<%s %s>\n", directive, file), 2, "dwxcore",
             "base/dwxcore/dwxparse", 856);
     }
     HeapText path(HStringExpand(file));
+    if (gSearchNextToIncluder.load(std::memory_order_relaxed)) {
+        if (HeapText nearby{IMPFindFileNextTo(fileName, path.get())}) {
+            path = std::move(nearby);
+        }
+    }
     if (!DKCheck(path.get())) {
         HeapText found(IMPFindFile("etc", path.get()));
         if (!found) {
@@ -469,17 +655,17 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
     if (DKCheck(path.get())) {
         std::string canonical = CanonicalPath(path.get());
         if (IsOnChain(canonical)) {
-            IMPError(3, 2,
-                     MkName(_("Include cycle: file '%s'\nrequested in %s directive\non line %d of "
-                              "file '%s'\nis already being read.\nIgnoring.\n"),
-                            path.get(), directive, line, SourceName(fileName)));
+            Report(3, 2, fileName, line,
+                   MkName(_("Include cycle: file '%s'\nrequested in %s directive\non line %d of "
+                            "file '%s'\nis already being read.\nIgnoring.\n"),
+                          path.get(), directive, line, SourceName(fileName)));
             return;
         }
         if (tChain.depth >= kMaxIncludeDepth) {
-            IMPError(3, 2,
-                     MkName(_("Include depth limit of %d reached: file '%s'\nrequested in %s "
-                              "directive\non line %d of file '%s'.\nIgnoring.\n"),
-                            kMaxIncludeDepth, path.get(), directive, line, SourceName(fileName)));
+            Report(3, 2, fileName, line,
+                   MkName(_("Include depth limit of %d reached: file '%s'\nrequested in %s "
+                            "directive\non line %d of file '%s'.\nIgnoring.\n"),
+                          kMaxIncludeDepth, path.get(), directive, line, SourceName(fileName)));
             return;
         }
         // A file that DKCheck accepted but that cannot be opened or read
@@ -493,24 +679,53 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
             }
             TextLineReader lines;
             if (lines.OpenFile(openedName)) {
+                if (poLog) {
+                    PTNReadLogWriter::AddFile(*poLog, openedName, canonical);
+                }
                 ChainEntry entry(std::move(canonical), true);
                 int counter = 0;
-                Read(target, lines, openedName, counter);
+                Read(target, lines, InternSource(openedName, source, line), counter);
                 return;
             }
         }
     }
     if (required) {
-        IMPError(3, 2,
-                 MkName(_("Unable to locate file '%s'\nrequested in @include directive\non line "
-                          "%d of file '%s'.\nIgnoring.\n"),
-                        path.get(), line, SourceName(fileName)));
+        Report(3, 2, fileName, line,
+               MkName(_("Unable to locate file '%s'\nrequested in @include directive\non line "
+                        "%d of file '%s'.\nIgnoring.\n"),
+                      path.get(), line, SourceName(fileName)));
+    }
+}
+
+// Runs a whole read. With a log, the exception that ends a read on a corrupt
+// line stays here; its report is in the log already.
+template <typename Lines>
+void ReadAll(PTNSubTree* tree, Lines& lines, const char* fileName, PTNReadLog* log) {
+    TreeReader reader(log);
+    int counter = 0;
+    if (!log) {
+        reader.Read(tree, lines, InternSource(fileName, nullptr, 0), counter);
+        return;
+    }
+    size_t reports = PTNReadLogWriter::ReportCount(*log);
+    try {
+        reader.Read(tree, lines, InternSource(fileName, nullptr, 0), counter);
+    } catch (const tzn::Exception& error) {
+        // A read must not end without a report saying why.
+        if (PTNReadLogWriter::ReportCount(*log) == reports) {
+            PTNReadLogWriter::AddReport(*log, error.Code(), error.Severity(), SourceName(fileName),
+                                        counter, error.what());
+        }
     }
 }
 
 }  // namespace
 
 void PTNSubTree::BuildFromFile(FILE* stream) {
+    BuildFromFile(stream, nullptr);
+}
+
+void PTNSubTree::BuildFromFile(FILE* stream, PTNReadLog* log) {
     if (!stream) {
         return;
     }
@@ -526,22 +741,30 @@ void PTNSubTree::BuildFromFile(FILE* stream) {
     }
     std::unique_ptr<ChainEntry> entry;
     if (name) {
-        entry = std::make_unique<ChainEntry>(CanonicalPath(name), false);
+        std::string canonical = CanonicalPath(name);
+        if (log) {
+            PTNReadLogWriter::AddFile(*log, name, canonical);
+        }
+        entry = std::make_unique<ChainEntry>(std::move(canonical), false);
     }
-    TreeReader reader;
-    int counter = 0;
-    reader.Read(this, lines, name, counter);
+    ReadAll(this, lines, name, log);
 }
 
 void PTNSubTree::BuildFromString(const char* buffer) {
+    BuildFromString(buffer, nullptr);
+}
+
+void PTNSubTree::BuildFromString(const char* buffer, PTNReadLog* log) {
     if (!buffer) {
         return;
     }
     TextLineReader lines;
     lines.OpenBuffer(buffer);
-    TreeReader reader;
-    int counter = 0;
-    reader.Read(this, lines, nullptr, counter);
+    ReadAll(this, lines, nullptr, log);
+}
+
+void PTNSubTree::SetIncludeSearchNextToIncluder(bool on) {
+    gSearchNextToIncluder.store(on, std::memory_order_relaxed);
 }
 
 char** PTNSubTree::AddChildrenFromStringList(char** lines, const char* fileName, int* lineCounter) {
@@ -549,9 +772,9 @@ char** PTNSubTree::AddChildrenFromStringList(char** lines, const char* fileName,
         return nullptr;
     }
     ListLines source(lines);
-    TreeReader reader;
+    TreeReader reader(nullptr);
     int counter = lineCounter ? *lineCounter : 0;
-    bool finished = reader.Read(this, source, fileName, counter);
+    bool finished = reader.Read(this, source, InternSource(fileName, nullptr, 0), counter);
     if (lineCounter) {
         *lineCounter = counter;
     }

@@ -119,6 +119,11 @@ DWXSERVICES_API const char* fp2filename(FILE* stream);
 // first directory holding a readable regular file wins. Caller frees with
 // free(); null when not found or for an unknown key.
 DWXSERVICES_API char* IMPFindFile(const char* key, const char* name);
+// The file `name` in the directory of the file `includer`, as a path made of
+// the two, when `name` is relative, `includer` has a directory part and the
+// result is a readable regular file; null otherwise (null arguments
+// included). Caller frees with free().
+DWXSERVICES_API char* IMPFindFileNextTo(const char* includer, const char* name);
 // A heap copy of `text` with $NAME and ${NAME} replaced by the environment
 // variable's value; an unset variable gives an empty text, and a '$' not
 // followed by a name (or "${" without its "}") stays as it is. Null gives

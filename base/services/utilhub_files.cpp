@@ -7,6 +7,7 @@
 #include <string.h>
 #include <sys/stat.h>
 
+#include <filesystem>
 #include <mutex>
 #include <string>
 #include <unordered_map>
@@ -148,6 +149,19 @@ char* IMPFindFile(const char* key, const char* name) {
         p = *end ? end + 1 : end;
     }
     return nullptr;
+}
+
+char* IMPFindFileNextTo(const char* includer, const char* name) {
+    if (!includer || !name || !*name) {
+        return nullptr;
+    }
+    const std::filesystem::path relative(name);
+    const std::filesystem::path directory = std::filesystem::path(includer).parent_path();
+    if (relative.is_absolute() || relative.has_root_name() || directory.empty()) {
+        return nullptr;
+    }
+    const std::string candidate = (directory / relative).string();
+    return DKCheck(candidate.c_str()) ? HString(candidate.c_str()) : nullptr;
 }
 
 char* HStringExpand(const char* text) {
