@@ -18,6 +18,7 @@
 #include <services/tracer.h>
 #include <services/utilhub.h>
 
+#include <errno.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
@@ -50,11 +51,6 @@ struct FreeDeleter {
     void operator()(char* text) const { free(text); }
 };
 using HeapText = std::unique_ptr<char, FreeDeleter>;
-
-struct StreamCloser {
-    void operator()(FILE* stream) const { DKClose(stream); }
-};
-using StreamPtr = std::unique_ptr<FILE, StreamCloser>;
 
 using dwxparse_scan::BeginsWith;
 using dwxparse_scan::ClassOf;
@@ -200,14 +196,38 @@ class ChainEntry {
     throw tzn::Exception(-1, 1, message.c_str());
 }
 
-// The whole content of a stream from its start; the stream is left at its start.
-std::string ReadStream(FILE* stream) {
+// Reports a read error that ended the reading of a file after `line`; the
+// nodes read before it stay in the tree.
+void ReportReadError(const char* fileName, int line, int error) {
+    std::string reason = std::generic_category().message(error);
+    IMPError(3, 2,
+             MkName(_("Read error in file '%s'\nafter line %d: %s.\nThe lines before it were "
+                      "kept.\n"),
+                    SourceName(fileName), line, reason.c_str()));
+}
+
+// The whole content of a stream from its start; the stream is left at its
+// start. A read error ends the content at the last complete line before it
+// and stores the system's error number in `error` (EIO when it gave none).
+std::string ReadStream(FILE* stream, int& error) {
     rewind(stream);
     std::string content;
     char chunk[65536];
     size_t got;
-    while ((got = fread(chunk, 1, sizeof chunk, stream)) > 0) {
+    error = 0;
+    for (;;) {
+        errno = 0;
+        got = fread(chunk, 1, sizeof chunk, stream);
         content.append(chunk, got);
+        if (ferror(stream)) {
+            error = errno ? errno : EIO;
+            size_t lineEnd = content.rfind('\n');
+            content.resize(lineEnd == std::string::npos ? 0 : lineEnd + 1);
+            break;
+        }
+        if (got == 0) {
+            break;
+        }
     }
     rewind(stream);
     return content;
@@ -482,22 +502,18 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
                             kMaxIncludeDepth, path.get(), directive, line, SourceName(fileName)));
             return;
         }
-        // A file that DKCheck accepted but that cannot be opened or read
-        // after all is handled as a missing one.
-        StreamPtr stream(DKOpen(path.get(), 4, "r"));
-        if (stream) {
-            rewind(stream.get());
-            const char* openedName = fp2filename(stream.get());
-            if (!openedName) {
-                openedName = path.get();
+        // The file is opened once, by the line reader, which never waits on
+        // a FIFO put in its place since the check. A file that DKCheck
+        // accepted but that cannot be opened after all is handled as a
+        // missing one.
+        TextLineReader lines;
+        if (lines.OpenFile(path.get())) {
+            ChainEntry entry(std::move(canonical), true);
+            int counter = 0;
+            if (Read(target, lines, path.get(), counter) && lines.Failed()) {
+                ReportReadError(path.get(), counter, lines.ErrorNumber());
             }
-            TextLineReader lines;
-            if (lines.OpenFile(openedName)) {
-                ChainEntry entry(std::move(canonical), true);
-                int counter = 0;
-                Read(target, lines, openedName, counter);
-                return;
-            }
+            return;
         }
     }
     if (required) {
@@ -518,10 +534,11 @@ void PTNSubTree::BuildFromFile(FILE* stream) {
     const char* name = fp2filename(stream);
     TextLineReader lines;
     std::string content;
+    int streamError = 0;
     if (!name || !lines.OpenFile(name)) {
         // A stream that DKOpen did not open (or whose file went away) is
         // read from its own content.
-        content = ReadStream(stream);
+        content = ReadStream(stream, streamError);
         lines.OpenBuffer(content.c_str());
     }
     std::unique_ptr<ChainEntry> entry;
@@ -530,7 +547,12 @@ void PTNSubTree::BuildFromFile(FILE* stream) {
     }
     TreeReader reader;
     int counter = 0;
-    reader.Read(this, lines, name, counter);
+    if (reader.Read(this, lines, name, counter)) {
+        int error = lines.Failed() ? lines.ErrorNumber() : streamError;
+        if (error != 0) {
+            ReportReadError(name, counter, error);
+        }
+    }
 }
 
 void PTNSubTree::BuildFromString(const char* buffer) {
