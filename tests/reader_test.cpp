@@ -10,10 +10,14 @@
 
 #include <gtest/gtest.h>
 
+#include <errno.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
+#include <algorithm>
 #include <functional>
 #include <memory>
 #include <sstream>
@@ -356,6 +360,91 @@ TEST_F(ReaderTest, IncludeCycleAndDepthLimit) {
     EXPECT_EQ(
         gReports[0].find("3/2 Include depth limit of 64 reached: file '" + oDir.Path(chain(65))),
         0u);
+}
+
+// The null device, under any name, switches an include off silently; every
+// other kind of file that is not a regular one is refused as missing, and a
+// FIFO without a writer is refused at once rather than waited on.
+TEST_F(ReaderTest, NullDeviceIsAnEmptyIncludeOtherSpecialFilesAreMissing) {
+    std::string fifo = oDir.Path("pipe");
+    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    std::string nullLink = oDir.Path("off.cfg");
+    ASSERT_EQ(symlink("/dev/null", nullLink.c_str()), 0);
+    struct Row {
+        std::string target;
+        bool missing;
+    } rows[] = {
+        {"/dev/null", false}, {nullLink, false},   {fifo, true},
+        {"/dev/zero", true},  {oDir.Root(), true},
+    };
+    for (const Row& row : rows) {
+        for (const char* directive : {"@include", "@try_include"}) {
+            gReports.clear();
+            auto tree = Read("(a Integer 1)\n(" + std::string(directive) + " " + row.target +
+                             ")\n(b Integer 2)\n");
+            EXPECT_EQ(Shape(tree.get()), "a b") << row.target;
+            bool reported = row.missing && directive[1] == 'i';
+            ASSERT_EQ(gReports.size(), reported ? 1u : 0u) << directive << " " << row.target;
+            if (reported) {
+                EXPECT_EQ(gReports[0].find("3/2 Unable to locate file '" + row.target + "'"), 0u);
+            }
+        }
+    }
+}
+
+// A stream that hands out `text` up to byte `failAt`, then fails with EIO. It
+// cannot seek: rewinding it fails harmlessly, since it is read from its start.
+struct FailingSource {
+    std::string text;
+    size_t failAt;
+    size_t position = 0;
+};
+
+FILE* OpenFailing(FailingSource& source) {
+    cookie_io_functions_t io = {};
+    io.read = [](void* cookie, char* buffer, size_t size) -> ssize_t {
+        auto* source = static_cast<FailingSource*>(cookie);
+        if (source->position >= source->failAt) {
+            errno = EIO;
+            return -1;
+        }
+        size_t count = std::min(size, source->failAt - source->position);
+        memcpy(buffer, source->text.data() + source->position, count);
+        source->position += count;
+        return static_cast<ssize_t>(count);
+    };
+    return fopencookie(&source, "r", io);
+}
+
+// A read error is reported with the file, the line reached and the system's
+// reason; the complete lines before it stay read, the line it cut short is
+// dropped rather than read with a truncated value.
+TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
+    auto report = [](const std::string& file, int line) {
+        return "3/2 Read error in file '" + file + "'\nafter line " + std::to_string(line) + ": " +
+               strerror(EIO) + ".\nThe lines before it were kept.\n";
+    };
+    std::string text = "(a Integer 1)\n(s SubTree\n  (b Integer 2)\n  (c Integer 345)\n)\n";
+    FailingSource source{text, text.find("5)")};
+    FILE* stream = OpenFailing(source);
+    ASSERT_NE(stream, nullptr);
+    PTNSubTree tree("root");
+    tree.BuildFromFile(stream);
+    fclose(stream);
+    EXPECT_EQ(Shape(&tree, true), "a:PTNInteger=1 s{b:PTNInteger=2}");
+    EXPECT_EQ(gReports, Texts{report("Memory", 3)});
+
+    // The kernel refuses to read the first page of a process's memory: a
+    // real error on a file that passes every check. Through an include, and
+    // as the file the reading starts from.
+    gReports.clear();
+    auto included = Read("(a Integer 1)\n(@include /proc/self/mem)\n(b Integer 2)\n");
+    EXPECT_EQ(Shape(included.get()), "a b");
+    EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
+    gReports.clear();
+    PTNSubTree whole("root");
+    ReadFile(whole, "/proc/self/mem");
+    EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
 }
 
 TEST_F(ReaderTest, IncludeTrace) {

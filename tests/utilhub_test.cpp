@@ -183,14 +183,22 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
     free(joined);
 }
 
-TEST(UtilhubFiles, OnlyReadableRegularFilesPassTheCheck) {
+// Only regular files and the null device (under any name) pass; a FIFO
+// without a writer is refused at once, never waited on.
+TEST(UtilhubFiles, OnlyReadableRegularFilesAndTheNullDevicePassTheCheck) {
     ScratchDir dir;
     std::string file = dir.Write("plain.cfg", "x\n");
     std::string fifo = dir.Path("pipe");
+    std::string nullLink = dir.Path("off.cfg");
     ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    ASSERT_EQ(symlink("/dev/null", nullLink.c_str()), 0);
     EXPECT_EQ(DKCheck(file.c_str()), 1);
-    for (const std::string& path : {dir.Root(), std::string("/dev/null"), std::string("/dev/zero"),
-                                    fifo, dir.Path("missing"), std::string()}) {
+    for (const std::string& path : {std::string("/dev/null"), nullLink}) {
+        EXPECT_EQ(DKCheck(path.c_str()), 1) << path;
+        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), Lines{}) << path;
+    }
+    for (const std::string& path :
+         {dir.Root(), std::string("/dev/zero"), fifo, dir.Path("missing"), std::string()}) {
         EXPECT_EQ(DKCheck(path.c_str()), 0) << path;
         EXPECT_EQ(TextFileToStringList(path.c_str()), nullptr) << path;
         TextLineReader reader;

@@ -23,8 +23,9 @@ const char kInvalidMonth[] = "Invalid Month for DWXDate Object (month, day, year
 const char kInvalidDay[] = "Invalid Day for DWXDate Object (month, day, year):  %d %d %d.\n";
 const char kInvalidYear[] = "Invalid Year for DWXDate Object (month, day, year):  %d %d %d.\n";
 
-// Shared by every GetString call without a buffer.
-char gStaticText[24];
+// Shared by every GetString call without a buffer on one thread; each thread
+// has its own, so dates on different threads never write into each other's text.
+thread_local char gStaticText[24];
 
 // Days in a 400-, 100- and 4-year cycle of the Gregorian calendar.
 const int64_t kDaysPer400 = 146097;

@@ -18,6 +18,7 @@
 #include <services/tracer.h>
 #include <services/utilhub.h>
 
+#include <errno.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
@@ -88,11 +89,6 @@ struct FreeDeleter {
     void operator()(char* text) const { free(text); }
 };
 using HeapText = std::unique_ptr<char, FreeDeleter>;
-
-struct StreamCloser {
-    void operator()(FILE* stream) const { DKClose(stream); }
-};
-using StreamPtr = std::unique_ptr<FILE, StreamCloser>;
 
 using dwxparse_scan::BeginsWith;
 using dwxparse_scan::ClassOf;
@@ -286,14 +282,28 @@ bool IsDoubleText(const char* text) {
     return end != text && *end == '\0';
 }
 
-// The whole content of a stream from its start; the stream is left at its start.
-std::string ReadStream(FILE* stream) {
+// The whole content of a stream from its start; the stream is left at its
+// start. A read error ends the content at the last complete line before it
+// and stores the system's error number in `error` (EIO when it gave none).
+std::string ReadStream(FILE* stream, int& error) {
     rewind(stream);
     std::string content;
     char chunk[65536];
     size_t got;
-    while ((got = fread(chunk, 1, sizeof chunk, stream)) > 0) {
+    error = 0;
+    for (;;) {
+        errno = 0;
+        got = fread(chunk, 1, sizeof chunk, stream);
         content.append(chunk, got);
+        if (ferror(stream)) {
+            error = errno ? errno : EIO;
+            size_t lineEnd = content.rfind('\n');
+            content.resize(lineEnd == std::string::npos ? 0 : lineEnd + 1);
+            break;
+        }
+        if (got == 0) {
+            break;
+        }
     }
     rewind(stream);
     return content;
@@ -339,6 +349,10 @@ class TreeReader {
     // Every report of the reader passes here: to the log when there is one,
     // else to IMPError. Severity 1 raises tzn::Exception either way.
     void Report(int code, int severity, const char* fileName, int line, const char* message);
+
+    // Reports a read error that ended the reading of a file after `line`;
+    // the nodes read before it stay in the tree.
+    void ReportReadError(const char* fileName, int line, int error);
 
   private:
     [[noreturn]] void ReportCorruptLine(const char* fileName, int line);
@@ -431,6 +445,14 @@ void TreeReader::Report(int code, int severity, const char* fileName, int line,
         // Also a guard against a reporting service that returns after all.
         throw tzn::Exception(code, severity, message);
     }
+}
+
+void TreeReader::ReportReadError(const char* fileName, int line, int error) {
+    std::string reason = std::generic_category().message(error);
+    Report(3, 2, fileName, line,
+           MkName(_("Read error in file '%s'\nafter line %d: %s.\nThe lines before it were "
+                    "kept.\n"),
+                  SourceName(fileName), line, reason.c_str()));
 }
 
 void TreeReader::ReportCorruptLine(const char* fileName, int line) {
@@ -668,25 +690,22 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
                           kMaxIncludeDepth, path.get(), directive, line, SourceName(fileName)));
             return;
         }
-        // A file that DKCheck accepted but that cannot be opened or read
-        // after all is handled as a missing one.
-        StreamPtr stream(DKOpen(path.get(), 4, "r"));
-        if (stream) {
-            rewind(stream.get());
-            const char* openedName = fp2filename(stream.get());
-            if (!openedName) {
-                openedName = path.get();
+        // The file is opened once, by the line reader, which never waits on
+        // a FIFO put in its place since the check. A file that DKCheck
+        // accepted but that cannot be opened after all is handled as a
+        // missing one.
+        TextLineReader lines;
+        if (lines.OpenFile(path.get())) {
+            if (poLog) {
+                PTNReadLogWriter::AddFile(*poLog, path.get(), canonical);
             }
-            TextLineReader lines;
-            if (lines.OpenFile(openedName)) {
-                if (poLog) {
-                    PTNReadLogWriter::AddFile(*poLog, openedName, canonical);
-                }
-                ChainEntry entry(std::move(canonical), true);
-                int counter = 0;
-                Read(target, lines, InternSource(openedName, source, line), counter);
-                return;
+            ChainEntry entry(std::move(canonical), true);
+            int counter = 0;
+            if (Read(target, lines, InternSource(path.get(), source, line), counter) &&
+                lines.Failed()) {
+                ReportReadError(path.get(), counter, lines.ErrorNumber());
             }
+            return;
         }
     }
     if (required) {
@@ -700,17 +719,23 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
 // Runs a whole read. With a log, the exception that ends a read on a corrupt
 // line stays here; its report is in the log already.
 template <typename Lines>
-void ReadAll(PTNSubTree* tree, Lines& lines, const char* fileName, PTNReadLog* log) {
+void ReadAll(PTNSubTree* tree, Lines& lines, const char* fileName, PTNReadLog* log,
+             int streamError) {
     TreeReader reader(log);
     int counter = 0;
-    if (!log) {
-        reader.Read(tree, lines, InternSource(fileName, nullptr, 0), counter);
-        return;
-    }
-    size_t reports = PTNReadLogWriter::ReportCount(*log);
+    const PTNSourceFile* source = InternSource(fileName, nullptr, 0);
+    size_t reports = log ? PTNReadLogWriter::ReportCount(*log) : 0;
     try {
-        reader.Read(tree, lines, InternSource(fileName, nullptr, 0), counter);
+        if (reader.Read(tree, lines, source, counter)) {
+            int error = lines.Failed() ? lines.ErrorNumber() : streamError;
+            if (error != 0) {
+                reader.ReportReadError(fileName, counter, error);
+            }
+        }
     } catch (const tzn::Exception& error) {
+        if (!log) {
+            throw;
+        }
         // A read must not end without a report saying why.
         if (PTNReadLogWriter::ReportCount(*log) == reports) {
             PTNReadLogWriter::AddReport(*log, error.Code(), error.Severity(), SourceName(fileName),
@@ -733,10 +758,11 @@ void PTNSubTree::BuildFromFile(FILE* stream, PTNReadLog* log) {
     const char* name = fp2filename(stream);
     TextLineReader lines;
     std::string content;
+    int streamError = 0;
     if (!name || !lines.OpenFile(name)) {
         // A stream that DKOpen did not open (or whose file went away) is
         // read from its own content.
-        content = ReadStream(stream);
+        content = ReadStream(stream, streamError);
         lines.OpenBuffer(content.c_str());
     }
     std::unique_ptr<ChainEntry> entry;
@@ -747,7 +773,7 @@ void PTNSubTree::BuildFromFile(FILE* stream, PTNReadLog* log) {
         }
         entry = std::make_unique<ChainEntry>(std::move(canonical), false);
     }
-    ReadAll(this, lines, name, log);
+    ReadAll(this, lines, name, log, streamError);
 }
 
 void PTNSubTree::BuildFromString(const char* buffer) {
@@ -760,7 +786,7 @@ void PTNSubTree::BuildFromString(const char* buffer, PTNReadLog* log) {
     }
     TextLineReader lines;
     lines.OpenBuffer(buffer);
-    ReadAll(this, lines, nullptr, log);
+    ReadAll(this, lines, nullptr, log, 0);
 }
 
 void PTNSubTree::SetIncludeSearchNextToIncluder(bool on) {

@@ -59,9 +59,10 @@ class DWXSERVICES_API TextLineReader {
     TextLineReader(const TextLineReader&) = delete;
     TextLineReader& operator=(const TextLineReader&) = delete;
 
-    // Starts on the file at `path`. 0, and no lines, when it is not a regular
-    // file that can be opened for reading. The file stays open until the
-    // reader is destroyed or opened again.
+    // Starts on the file at `path`. 0, and no lines, when it is neither a
+    // regular file that can be opened for reading nor the null device (which
+    // has no lines). The file stays open until the reader is destroyed or
+    // opened again.
     int OpenFile(const char* path);
     // Starts on a NUL-terminated buffer (null has no lines). The buffer is not
     // copied: it must stay unchanged while the reader walks it.
@@ -72,8 +73,12 @@ class DWXSERVICES_API TextLineReader {
     // terminator included, and it is valid until the next call.
     char* Next(size_t* length);
     // Non-zero when reading the file failed; the lines handed out before that
-    // are the ones before the failure.
+    // are the complete lines before the failure (a line the failure cut short
+    // is not handed out).
     int Failed() const { return bFailed ? 1 : 0; }
+    // The system's error number of that failure (EIO when the system gave
+    // none); 0 while reading has not failed.
+    int ErrorNumber() const { return nError; }
 
   private:
     void Close();
@@ -91,12 +96,14 @@ class DWXSERVICES_API TextLineReader {
     bool bEnd;
     bool bFailed;
     bool bNul;  // a NUL byte was read: lines are cut at their first one
+    int nError;
 };
 
 // ---------------------------------------------------------------------------
 // Files and paths
 
-// Non-zero only for a regular file that can be opened for reading.
+// Non-zero only for a regular file that can be opened for reading, or the null
+// device, which reads as an empty file. Never blocks, a FIFO's path included.
 DWXSERVICES_API int DKCheck(const char* path);
 // Opens `path` with fopen mode `how` and remembers the path for fp2filename;
 // null when it cannot be opened. `mode` is kept for compatibility (4 = read).
