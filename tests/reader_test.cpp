@@ -445,6 +445,20 @@ TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
     PTNSubTree whole("root");
     ReadFile(whole, "/proc/self/mem");
     EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
+
+    // With a read log the report goes there, with its place, and nowhere else.
+    gReports.clear();
+    FailingSource again{text, text.find("5)")};
+    stream = OpenFailing(again);
+    PTNSubTree logged("root");
+    PTNReadLog log;
+    logged.BuildFromFile(stream, &log);
+    fclose(stream);
+    EXPECT_TRUE(gReports.empty());
+    ASSERT_EQ(log.Reports().size(), 1u);
+    EXPECT_EQ(log.Reports()[0].code, 3);
+    EXPECT_EQ(log.Reports()[0].file, "Memory");
+    EXPECT_EQ(log.Reports()[0].line, 3);
 }
 
 TEST_F(ReaderTest, IncludeTrace) {
