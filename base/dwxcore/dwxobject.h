@@ -76,7 +76,8 @@ class DWXCORE_API DWXContainer : public DWXObject {
     // snapshot of its members, so they end up there twice.
     void AddContainer(const DWXContainer* other);
     // Deletes the members met by a walk, each distinct pointer once, then
-    // empties the container.
+    // empties the container. Each member is taken out before it is deleted,
+    // so its destructor may remove, delete or add other members.
     void DestroyContents();
 
   protected:
@@ -247,6 +248,8 @@ class DWXCORE_API DWXPackedArray : public DWXArray {
 // 1.3 plus 5. Stores null pointers too; a walk ends at the first null member.
 // Owns its buffer, never its members.
 class DWXCORE_API DWXBag : public DWXContainer {
+    friend class DWXContainer;
+
   public:
     DWXBag();
     // The members of `container` in its walk order. A null `container` gives
@@ -273,6 +276,11 @@ class DWXCORE_API DWXBag : public DWXContainer {
   protected:
     int nCapacity;
     DWXObject** ppoItems;
+
+  private:
+    // DestroyContents of a bag: in slot order, each slot is cleared before its
+    // member is deleted.
+    void DestroyInOrder();
 };
 
 // A node of a DWXLinkedList; created and deleted by the list alone.
