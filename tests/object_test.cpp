@@ -1,11 +1,13 @@
 #include "container_test_util.h"
 #include "counting_object.h"
 
+#include <dwxcore/dwxcmdline.h>
 #include <dwxcore/dwxobject.h>
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <type_traits>
 #include <vector>
 
 DEFINE_COUNTING_OBJECT_COUNTERS();
@@ -89,6 +91,37 @@ TEST(ObjectTest, IteratorProtocol) {
     EXPECT_EQ(iter.Current(), nullptr);
     EXPECT_EQ(iter.Start(), &d);
     EXPECT_EQ(iter.Next(), nullptr);
+}
+
+// Hosts write `DWXIter iter = &array;` and pass containers where arrays are expected.
+static_assert(std::is_convertible_v<DWXArray*, DWXIter> &&
+                  std::is_convertible_v<DWXLinkedList*, DWXArray> &&
+                  std::is_convertible_v<DWXBag*, DWXPackedArray> &&
+                  std::is_convertible_v<DWXArray*, DWXBag> &&
+                  std::is_convertible_v<const char*, DWXCmdLine>,
+              "constructors from a container or a command string are implicit");
+
+TEST(ObjectTest, RetargetingAnIteratorStartsOnTheNewContainer) {
+    CountingObject a, b, c;
+    DWXArray array;
+    DWXBag bag;
+    DWXLinkedList list;
+    std::vector<DWXContainer*> all = {&array, &bag, &list};
+    for (DWXContainer* container : all) {
+        AddAll(*container, {&a, &b, &c});
+    }
+    for (DWXContainer* from : all) {
+        for (DWXContainer* to : all) {
+            DWXIter iter = from;
+            iter.Next();
+            iter.SetTarget(to);
+            EXPECT_EQ(iter.Next(), to == from ? &c : &a)
+                << from->GetClassName() << " to " << to->GetClassName();
+            iter.SetTarget(nullptr);
+            iter.SetTarget(to);
+            EXPECT_EQ(iter.Next(), &a);
+        }
+    }
 }
 
 TEST(ObjectTest, ValidateAsksValidatableMembersUntilOneFails) {

@@ -267,18 +267,18 @@ void DWXArray::Reverse() {
 }
 
 void DWXArray::Sort(int (*compare)(const void*, const void*)) {
+    Pack();  // also without a comparator: callers rely on the holes being gone
     if (!compare) {
         return;
     }
-    Pack();
     dwxcore_detail::QuickSort(ppoItems, nCount, sizeof(DWXObject*), compare);
 }
 
 void DWXArray::StandartSort(int (*compare)(const void*, const void*)) {
+    Pack();  // also without a comparator: callers rely on the holes being gone
     if (!compare) {
         return;
     }
-    Pack();
     if (nCount > 1) {
         TZN_qsort(ppoItems, nCount, sizeof(DWXObject*), compare);
     }

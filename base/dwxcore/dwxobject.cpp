@@ -172,6 +172,10 @@ DWXIter& DWXIter::operator++() {
 }
 
 void DWXIter::SetTarget(const DWXContainer* container) {
+    if (container != poTarget) {
+        // An array's slot index read as a list node would crash the list.
+        nPosition = 0;
+    }
     poTarget = container;
     poCurrent = nullptr;
 }
