@@ -181,6 +181,7 @@ char** DuplicateStringList(char* const* list) {
 
 char** AddStringToList(char** list, const char* text) {
     ListBuilder builder(list);
+    builder.Reserve(1);  // exactly one more slot: the allocator often grows in place
     builder.Push(HString(text ? text : ""));
     return builder.Finish();
 }
