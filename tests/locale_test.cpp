@@ -169,8 +169,14 @@ struct LocaleCase {
     std::function<bool()> inEffect;
 };
 
+// Puts the "C" locale back however the test ends.
+struct RestoreCLocale {
+    ~RestoreCLocale() { setlocale(LC_ALL, "C"); }
+};
+
 TEST(Locale, NamesAndNumbersGiveTheAnswersOfTheCLocale) {
     ScratchDir dir;
+    RestoreCLocale restore;
     ASSERT_NE(setlocale(LC_ALL, "C"), nullptr);
     const Answers expected = Ask(dir);
     // A few answers of the "C" locale, so that the comparison rests on sound ground.
@@ -215,7 +221,6 @@ TEST(Locale, NamesAndNumbersGiveTheAnswersOfTheCLocale) {
         EXPECT_EQ(log,
                   (std::vector<std::string>{"Ibis", "idle", "item", "Title", "Zeta", "\xDDtem"}));
     }
-    setlocale(LC_ALL, "C");
 }
 
 }  // namespace
