@@ -206,6 +206,9 @@ DWXString DWXColor::GetRGBName() const {
 }
 
 void DWXColor::Dump(FILE* stream) const {
+    if (!stream) {
+        return;
+    }
     fprintf(stream, "<DWXColor:%d,%d,%d>\n", nRed, nGreen, nBlue);
 }
 

@@ -2,9 +2,9 @@
 // reporting, exit hooks and the preference-format base classes.
 //
 // A string list is a null-terminated array of heap C strings; the array and
-// every entry come from malloc, and DestroyStringList releases both. The
-// array may have spare slots after its terminator, so that appending one
-// entry takes amortised constant time.
+// every entry come from malloc, and DestroyStringList releases both. Nothing
+// past the terminator is ever read, so hosts may build, cut and edit lists
+// themselves.
 #pragma once
 
 #include <services/rtprim.h>
@@ -34,9 +34,11 @@ DWXSERVICES_API void DestroyStringList(char** list);
 // A deep copy; null for a null list. Caller frees with DestroyStringList.
 DWXSERVICES_API char** DuplicateStringList(char* const* list);
 // Appends a copy of `text` (null is taken as "") and returns the list, which
-// may have moved; a null list starts a new one.
+// may have moved; a null list starts a new one. O(n): the end is found anew on
+// every call, so n appends one at a time cost O(n^2); build long lists in one call.
 DWXSERVICES_API char** AddStringToList(char** list, const char* text);
-// Appends copies of every entry of `other` and returns the list, which may have moved.
+// Appends copies of every entry of `other` and returns the list, which may have
+// moved; `other` may be the list itself. O(n + m), one reallocation.
 DWXSERVICES_API char** AddStringList(char** list, char* const* other);
 
 // One entry per line: split at LF, a CR ending a line is dropped, a UTF-8

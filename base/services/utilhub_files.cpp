@@ -4,7 +4,6 @@
 
 #include "utilhub_internal.h"
 
-#include <ctype.h>
 #include <stdlib.h>
 #include <string.h>
 #include <sys/stat.h>
@@ -38,12 +37,16 @@ StreamTable& Streams() {
     return *table;
 }
 
+// Environment names are ASCII letters, digits and '_', whatever the locale
+// says about other bytes.
 bool IsNameStart(char c) {
-    return isalpha(static_cast<unsigned char>(c)) || c == '_';
+    return (AsciiLower(static_cast<unsigned char>(c)) >= 'a' &&
+            AsciiLower(static_cast<unsigned char>(c)) <= 'z') ||
+           c == '_';
 }
 
 bool IsNameChar(char c) {
-    return isalnum(static_cast<unsigned char>(c)) || c == '_';
+    return IsNameStart(c) || (c >= '0' && c <= '9');
 }
 
 #if !defined(_WIN32)
