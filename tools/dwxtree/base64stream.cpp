@@ -12,14 +12,21 @@ namespace dwxtree {
 
 namespace {
 
-bool IsAlphabet(unsigned char c) {
-    return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9') || c == '+' ||
-           c == '/';
-}
+enum ByteClass : unsigned char { kAlphabet, kSpace, kPad, kOther };
 
-bool IsSpace(unsigned char c) {
-    return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f';
-}
+// The class of every byte value, built once.
+struct ByteClasses {
+    ByteClass of[256];
+    ByteClasses() {
+        for (int c = 0; c < 256; ++c) {
+            bool alphabet = (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') ||
+                            (c >= '0' && c <= '9') || c == '+' || c == '/';
+            bool space = c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f';
+            of[c] = alphabet ? kAlphabet : space ? kSpace : c == '=' ? kPad : kOther;
+        }
+    }
+};
+const ByteClasses kClasses;
 
 bool Write(const std::string& bytes, FILE* out, std::string& error) {
     if (!bytes.empty() && fwrite(bytes.data(), 1, bytes.size(), out) != bytes.size()) {
@@ -35,6 +42,13 @@ bool ReadFailed(FILE* in, std::string& error) {
         return true;
     }
     return false;
+}
+
+StreamResult Refuse(unsigned char c, size_t offset, std::string& error) {
+    char text[80];
+    snprintf(text, sizeof text, "not Base64: byte 0x%02x at offset %zu", c, offset);
+    error = text;
+    return StreamResult::kBadInput;
 }
 
 }  // namespace
@@ -66,22 +80,32 @@ StreamResult DecodeBase64Stream(FILE* in, FILE* out, std::string& error) {
     size_t offset = 0;  // of block[0] in the input
     size_t got;
     while ((got = fread(block.data(), 1, block.size(), in)) > 0) {
-        for (size_t i = 0; i < got; ++i) {
-            unsigned char c = block[i];
-            if (IsSpace(c)) {
+        const unsigned char* bytes = block.data();
+        for (size_t i = 0; i < got;) {
+            // Runs of alphabet characters, the bulk of any input, are
+            // copied whole.
+            size_t run = i;
+            while (run < got && kClasses.of[bytes[run]] == kAlphabet) {
+                ++run;
+            }
+            if (run > i) {
+                if (pads > 0) {
+                    return Refuse(bytes[i], offset + i, error);
+                }
+                pending.append(reinterpret_cast<const char*>(bytes + i), run - i);
+                characters += run - i;
+                i = run;
                 continue;
             }
-            if (c == '=' && pads < 2) {
+            unsigned char c = bytes[i];
+            ByteClass kind = kClasses.of[c];
+            if (kind == kPad && pads < 2) {
                 ++pads;
-            } else if (!IsAlphabet(c) || pads > 0) {
-                char text[80];
-                snprintf(text, sizeof text, "not Base64: byte 0x%02x at offset %zu", c, offset + i);
-                error = text;
-                return StreamResult::kBadInput;
-            } else {
-                ++characters;
+                pending.push_back('=');
+            } else if (kind != kSpace) {
+                return Refuse(c, offset + i, error);
             }
-            pending.push_back(static_cast<char>(c));
+            ++i;
         }
         offset += got;
         if (!Write(held, out, error)) {

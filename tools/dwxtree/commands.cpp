@@ -45,7 +45,8 @@ std::string OutputName(const Output& output) {
 // Ends a subcommand that wrote to `output`: a file is replaced only when
 // everything went well; a failed write is a problem too.
 int Finish(int code, Output& output) {
-    if (code != kExitOk && output.Replacing()) {
+    bool replacing = output.Replacing();
+    if (code != kExitOk && replacing) {
         output.Discard();
         Complain(Quote(output.Name()) + " left unchanged");
         return code;
@@ -53,6 +54,9 @@ int Finish(int code, Output& output) {
     std::string error;
     if (!output.Commit(error)) {
         Complain("cannot write " + OutputName(output) + ": " + error);
+        if (replacing) {
+            Complain(Quote(output.Name()) + " left unchanged");
+        }
         return kExitData;
     }
     return code;

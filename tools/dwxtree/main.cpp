@@ -31,16 +31,15 @@ const char kUsage[] =
     "  merge BASE OTHER [--except NAME]... [-o OUT]\n"
     "                                      OTHER's values merged into BASE\n"
     "  json FILE [-o OUT]                  the tree as JSON\n"
-    "  base64 --encode|--decode [FILE] [-o OUT]\n"
-    "                                      the Base64 codec\n"
+    "  base64 -e|-d [FILE] [-o OUT]        the Base64 codec\n"
     "\n"
     "  -h, --help     this text; after a subcommand, that subcommand's\n"
     "  --version      the version of dwxtree and its library\n"
     "\n"
     "Options and operands may come in any order. Each option has a single-\n"
-    "hyphen spelling (-o, -name, -except, -encode, -decode, -help) and a\n"
-    "double-hyphen one (--output, --name, --except, --encode, --decode,\n"
-    "--help); the double-hyphen one also takes its value after '='\n"
+    "hyphen spelling (-o, -name, -except, -e or -encode, -d or -decode, -h or\n"
+    "-help) and a double-hyphen one (--output, --name, --except, --encode,\n"
+    "--decode, --help); the double-hyphen one also takes its value after '='\n"
     "(--output=merged.cfg). '--' ends the options: every argument after it is\n"
     "an operand, whatever its first character. A FILE of '-' is standard\n"
     "input, an OUT of '-' standard output. File names are used byte for byte.\n"
@@ -68,8 +67,8 @@ const std::vector<OptionRule> kOptions = {
     {"output", "-o --output", Takes::kOneValue, false},
     {"name", "-name --name", Takes::kOneValue, false},
     {"except", "-except --except", Takes::kValues, true},
-    {"encode", "-encode --encode", Takes::kNothing, false},
-    {"decode", "-decode --decode", Takes::kNothing, false},
+    {"encode", "-e -encode --encode", Takes::kNothing, false},
+    {"decode", "-d -decode --decode", Takes::kNothing, false},
 };
 
 struct Subcommand {
@@ -172,7 +171,7 @@ const Subcommand kSubcommands[] = {
      1,
      {"encode", "decode", "output"},
      dwxtree::RunBase64,
-     "usage: dwxtree base64 --encode|--decode [FILE] [-o OUT]\n"
+     "usage: dwxtree base64 -e|--encode|-d|--decode [FILE] [-o OUT]\n"
      "\n"
      "Encodes the bytes of FILE (or standard input, also as '-') as one line\n"
      "of Base64 (RFC 4648, standard alphabet, '=' padding), or decodes Base64\n"
