@@ -144,6 +144,12 @@ bool Output::Open(const std::string& path, std::string& error) {
         bDirect = true;
         return true;
     }
+    // A file the user may not write stays so, although its directory
+    // would allow replacing it.
+    if (exists && access(path.c_str(), W_OK) != 0) {
+        error = ErrorText(errno);
+        return false;
+    }
     // Replace the file a link names, not the link.
     char resolved[PATH_MAX];
     if (exists && realpath(path.c_str(), resolved)) {

@@ -26,8 +26,8 @@ std::string ErrorText(int error);
 // keeps its old content, and a failure or Discard removes the temporary,
 // also when the process is interrupted by SIGINT, SIGTERM or SIGHUP.
 // A target that exists but is not a regular file (a device, a FIFO) is
-// written directly. Symbolic links are followed, so the file they name is
-// replaced, not the link.
+// written directly; one the user may not write is refused. Symbolic links are followed, so the file
+// they name is replaced, not the link.
 class Output {
   public:
     Output() = default;

@@ -174,6 +174,10 @@ def broken(tmp):
            err=r"^self\.cfg:2: warning: include cycle: 'self\.cfg' is already being read")
     expect("include cycle", ["show", "cycle_a.cfg"], tmp, 1,
            out="(a Integer 1)\n(b Integer 2)\n", err=r"^cycle_b\.cfg:2: warning: include cycle")
+    write(tmp, {"chain%d.cfg" % i: "(@include chain%d.cfg)\n" % (i + 1) for i in range(70)})
+    expect("include depth", ["check", "chain0.cfg"], tmp, 1, out="",
+           err=r"^chain64\.cfg:1: warning: include depth limit of 64 reached at 'chain65\.cfg'; "
+               r"ignored\n     1 \| \(@include chain65\.cfg\)\n$")
 
 
 def unreadable(tmp):
