@@ -11,9 +11,11 @@ import os
 import re
 import resource
 import stat
+import signal
 import subprocess
 import sys
 import tempfile
+import time
 
 DWXTREE = os.path.abspath(sys.argv[1])
 EXAMPLES = os.path.abspath(sys.argv[2])
@@ -345,6 +347,22 @@ def outputs(tmp):
     unchanged("write over the size limit", 1, ["merge", "base.cfg", "other.cfg", "-o", "base.cfg"],
               r"cannot write 'base\.cfg': file too large\n.*'base\.cfg' left unchanged",
               preexec_fn=limit)
+    # Interrupted while its input is still open: the temporary goes too.
+    proc = subprocess.Popen([DWXTREE, "base64", "-e", "-o", "base.cfg"], cwd=tmp,
+                            stdin=subprocess.PIPE, stderr=subprocess.PIPE)
+    proc.stdin.write(b"abc")
+    proc.stdin.flush()
+    for _ in range(500):
+        if any(n.startswith(".base.cfg") for n in os.listdir(tmp)):
+            break
+        time.sleep(0.01)
+    proc.terminate()
+    proc.wait()
+    proc.stdin.close()
+    proc.stderr.close()
+    unchanged("interrupted", 1, ["show", "bad.cfg", "-o", "base.cfg"], r"left unchanged")
+    if proc.returncode != -signal.SIGTERM:
+        failures.append("interrupted: exit %d" % proc.returncode)
     unchanged("read problems", 1, ["show", "bad.cfg", "-o", "base.cfg"], r"left unchanged")
     unchanged("merge of a bad file", 1, ["merge", "bad.cfg", "other.cfg", "-o", "base.cfg"],
               r"nothing written")
