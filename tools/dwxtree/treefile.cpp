@@ -3,7 +3,6 @@
 #include "iofiles.h"
 
 #include <dwxcore/dwxobject.h>
-#include <services/tracer.h>
 #include <services/utilhub.h>
 
 #include <ctype.h>
@@ -12,8 +11,6 @@
 #include <string.h>
 
 #include <algorithm>
-#include <filesystem>
-#include <system_error>
 #include <vector>
 
 namespace dwxtree {
@@ -21,7 +18,6 @@ namespace dwxtree {
 namespace {
 
 int gReports = 0;
-std::string gLastReport;
 // While standard input is read: its text, for the lines that reports show.
 const std::string* gStandardInput = nullptr;
 
@@ -118,116 +114,47 @@ std::string LineOf(const std::string& file, int line) {
     return finder.Text();
 }
 
-// A library report taken apart: file, line and a message in the tool's
-// words. The reader's texts are matched here and nowhere else; a text
-// that matches none is shown whole, on one line.
-struct LibraryReport {
-    std::string file;
-    int line = 0;
-    std::string message;
-};
-
-// The text between `before` and `after` in `text`, searching `after` from
-// the end; false when either is missing.
-bool Between(const std::string& text, const char* before, const char* after, std::string& out) {
-    size_t start = text.find(before);
-    size_t end = text.rfind(after);
-    if (start == std::string::npos || end == std::string::npos || end < start + strlen(before)) {
-        return false;
+// The text after `marker` up to the next quote: the file a report of an
+// include names. Empty when the marker is missing.
+std::string QuotedAfter(const std::string& text, const char* marker) {
+    size_t start = text.find(marker);
+    if (start == std::string::npos) {
+        return std::string();
     }
-    out = text.substr(start + strlen(before), end - start - strlen(before));
-    return true;
+    start += strlen(marker);
+    size_t end = text.find('\'', start);
+    return text.substr(start, end == std::string::npos ? end : end - start);
 }
 
-LibraryReport ParseLibraryReport(const char* message) {
-    std::string text = message ? message : "";
-    LibraryReport report;
-    std::string lineText;
-    std::string included;
-    if (text.compare(0, 13, "Corrupt file ") == 0 &&
-        Between(text, "Corrupt file ", "\n at line ", report.file) &&
-        Between(text, "\n at line ", " ...", lineText)) {
-        report.line = atoi(lineText.c_str());
-        report.message =
-            "corrupt line: expected '(NAME TYPE VALUE', '(NAME SubTree', ')' or a comment";
-    } else if (Between(text, "\non line ", " of file '", lineText) &&
-               (Between(text, " of file '", "'.\nIgnoring", report.file) ||
-                Between(text, " of file '", "'\nis already", report.file)) &&
-               Between(text, "file '", "'\nrequested in", included)) {
-        report.line = atoi(lineText.c_str());
-        if (text.compare(0, 14, "Include cycle:") == 0) {
-            report.message = "include cycle: '" + included + "' is already being read; ignored";
-        } else if (text.compare(0, 13, "Unable to loc") == 0) {
-            report.message = "cannot find include file '" + included + "'; ignored";
-        } else {
-            // The depth limit, and any other include report.
-            std::string head = text.substr(0, text.find(": file '"));
-            head[0] = static_cast<char>(tolower(static_cast<unsigned char>(head[0])));
-            report.message = head + " at '" + included + "'; ignored";
+// A report of the reader in the tool's words. The file and the line come
+// with the report; only its kind and the include it names are taken from
+// the text. A text of another kind is shown whole, on one line.
+std::string Wording(const PTNReadReport& report) {
+    const std::string& text = report.message;
+    if (report.code == -1 && report.severity == 1) {
+        return "corrupt line: expected '(NAME TYPE VALUE', '(NAME SubTree', ')' or a comment";
+    }
+    std::string included = QuotedAfter(text, "file '");
+    if (text.compare(0, 14, "Include cycle:") == 0) {
+        return "include cycle: '" + included + "' is already being read; ignored";
+    }
+    if (text.compare(0, 16, "Unable to locate") == 0) {
+        return "cannot find include file '" + included + "'; ignored";
+    }
+    if (text.compare(0, 19, "Include depth limit") == 0) {
+        std::string head = OneLine(text.substr(0, text.find(": file '")).c_str());
+        head[0] = 'i';
+        return head + " at '" + included + "'; ignored";
+    }
+    std::string line = OneLine(text.c_str());
+    if (!line.empty()) {
+        // A message in the compilers' form: lower case, no final stop.
+        line[0] = static_cast<char>(tolower(static_cast<unsigned char>(line[0])));
+        if (line.back() == '.') {
+            line.pop_back();
         }
-    } else {
-        report.message = OneLine(message);
-        return report;
     }
-    if (report.file == kReaderBufferName && gStandardInput) {
-        report.file = kStandardInputName;
-    }
-    return report;
-}
-
-void OnReport(int /*code*/, int severity, const char* message) {
-    gLastReport = message ? message : "";
-    LibraryReport report = ParseLibraryReport(message);
-    Report(report.file, report.line, severity <= 1 ? Severity::kError : Severity::kWarning,
-           report.message);
-}
-
-#ifdef _WIN32
-constexpr char kListSeparator = ';';
-void SetVariable(const char* name, const char* value) {
-    _putenv_s(name, value ? value : "");
-}
-#else
-constexpr char kListSeparator = ':';
-void SetVariable(const char* name, const char* value) {
-    if (value) {
-        setenv(name, value, 1);
-    } else {
-        unsetenv(name);
-    }
-}
-#endif
-
-// Appends a directory to the "etc" search path and restores the old value
-// when it goes out of scope.
-class EtcPathExtension {
-  public:
-    explicit EtcPathExtension(const char* file) {
-        const char* old = getenv(DWX_ETC_PATH_VARIABLE);
-        bHadOld = old != nullptr;
-        if (old) {
-            oOld = old;
-        }
-        std::string directory = std::filesystem::path(file).parent_path().string();
-        if (directory.empty()) {
-            directory = ".";
-        }
-        std::string extended = oOld.empty() ? directory : oOld + kListSeparator + directory;
-        SetVariable(DWX_ETC_PATH_VARIABLE, extended.c_str());
-    }
-    ~EtcPathExtension() { SetVariable(DWX_ETC_PATH_VARIABLE, bHadOld ? oOld.c_str() : nullptr); }
-    EtcPathExtension(const EtcPathExtension&) = delete;
-    EtcPathExtension& operator=(const EtcPathExtension&) = delete;
-
-  private:
-    bool bHadOld = false;
-    std::string oOld;
-};
-
-std::string Canonical(const std::string& path) {
-    std::error_code error;
-    std::filesystem::path canonical = std::filesystem::weakly_canonical(path, error);
-    return error ? path : canonical.string();
+    return line;
 }
 
 struct FreeText {
@@ -235,77 +162,10 @@ struct FreeText {
 };
 using HeapText = std::unique_ptr<char, FreeText>;
 
-// The file an include directive reaches, searched the way the reader
-// searches (as given, then "etc", then "pro"); empty when none.
-std::string ResolveInclude(const std::string& token) {
-    HeapText path(HStringExpand(token.c_str()));
-    if (!path) {
-        return std::string();
-    }
-    if (!DKCheck(path.get())) {
-        HeapText found(IMPFindFile("etc", path.get()));
-        if (!found) {
-            found.reset(IMPFindFile("pro", path.get()));
-        }
-        if (found) {
-            path = std::move(found);
-        }
-    }
-    return DKCheck(path.get()) ? Canonical(path.get()) : std::string();
+void OnReport(int /*code*/, int severity, const char* message) {
+    Report(std::string(), 0, severity <= 1 ? Severity::kError : Severity::kWarning,
+           OneLine(message));
 }
-
-// The reader traces every include directive when the debug level is set;
-// each trace ends in "<DIRECTIVE FILE>". Those are the files the reading
-// reached.
-void CollectIncludes(FILE* traces, std::set<std::string>& files) {
-    rewind(traces);
-    std::string all;
-    char chunk[4096];
-    size_t got;
-    while ((got = fread(chunk, 1, sizeof chunk, traces)) > 0) {
-        all.append(chunk, got);
-    }
-    size_t start = 0;
-    while ((start = all.find('<', start)) != std::string::npos) {
-        size_t blank = all.find(' ', start);
-        size_t end = all.find(">\n", start);
-        if (blank == std::string::npos || end == std::string::npos || blank > end) {
-            break;
-        }
-        std::string resolved = ResolveInclude(all.substr(blank + 1, end - blank - 1));
-        if (!resolved.empty()) {
-            files.insert(resolved);
-        }
-        start = end + 2;
-    }
-}
-
-// Turns include tracing on for its lifetime, into a scratch file.
-class IncludeTrace {
-  public:
-    IncludeTrace() : poStream(tmpfile()) {
-        if (poStream) {
-            nOldLevel = tzn::tracer::Debugger::moDebugLevel;
-            poOldStream = tzn::tracer::Debugger::SetStream(poStream);
-            tzn::tracer::Debugger::moDebugLevel = 1;
-        }
-    }
-    ~IncludeTrace() {
-        if (poStream) {
-            tzn::tracer::Debugger::moDebugLevel = nOldLevel;
-            tzn::tracer::Debugger::SetStream(poOldStream == stderr ? nullptr : poOldStream);
-            fclose(poStream);
-        }
-    }
-    IncludeTrace(const IncludeTrace&) = delete;
-    IncludeTrace& operator=(const IncludeTrace&) = delete;
-    FILE* Stream() const { return poStream; }
-
-  private:
-    FILE* poStream;
-    FILE* poOldStream = nullptr;
-    int nOldLevel = 0;
-};
 
 }  // namespace
 
@@ -339,13 +199,12 @@ void Complain(const std::string& message) {
     Report(std::string(), 0, Severity::kError, message);
 }
 
-bool ReadTreeFile(const std::string& path, TreeFile& out, bool listFiles) {
+bool ReadTreeFile(const std::string& path, TreeFile& out) {
     bool standardInput = path == kStandardStream;
     out.root = std::make_unique<PTNSubTree>(path.c_str());
     out.name = standardInput ? kStandardInputName : path;
     out.text.clear();
-    out.files.clear();
-    out.reports = 0;
+    out.log = PTNReadLog();
     FILE* stream = nullptr;
     if (standardInput) {
         char chunk[65536];
@@ -357,6 +216,7 @@ bool ReadTreeFile(const std::string& path, TreeFile& out, bool listFiles) {
             Report(out.name, 0, Severity::kError, "cannot read: " + ErrorText(errno));
             return false;
         }
+        out.root->BuildFromString(out.text.c_str(), &out.log);
     } else {
         std::string reason = UnreadableReason(path, true);
         stream = reason.empty() ? DKOpen(path.c_str(), 4, "r") : nullptr;
@@ -365,47 +225,38 @@ bool ReadTreeFile(const std::string& path, TreeFile& out, bool listFiles) {
                    "cannot read: " + (reason.empty() ? ErrorText(errno) : reason));
             return false;
         }
+        out.root->BuildFromFile(stream, &out.log);
+        DKClose(stream);
     }
 
-    int before = ReportCount();
-    {
-        std::unique_ptr<EtcPathExtension> searchHere;
-        if (!standardInput) {
-            searchHere = std::make_unique<EtcPathExtension>(path.c_str());
-        }
-        std::unique_ptr<IncludeTrace> trace;
-        if (listFiles) {
-            trace = std::make_unique<IncludeTrace>();
-        }
-        gLastReport.clear();
-        gStandardInput = standardInput ? &out.text : nullptr;
-        try {
-            if (standardInput) {
-                out.root->BuildFromString(out.text.c_str());
-            } else {
-                out.root->BuildFromFile(stream);
-            }
-        } catch (const tzn::Exception& e) {
-            // The handler has shown the report already; only a text it has
-            // not seen is shown here.
-            if (gLastReport != e.what()) {
-                OnReport(e.Code(), e.Severity(), e.what());
-            }
-        }
-        if (trace && trace->Stream()) {
-            fflush(trace->Stream());
-            CollectIncludes(trace->Stream(), out.files);
+    // Every report of the read, then every warning, each at its own file
+    // and line.
+    gStandardInput = standardInput ? &out.text : nullptr;
+    for (const auto* list : {&out.log.Reports(), &out.log.Warnings()}) {
+        for (const PTNReadReport& report : *list) {
+            std::string file = standardInput && report.file == kReaderBufferName
+                                   ? std::string(kStandardInputName)
+                                   : report.file;
+            Report(file, report.line, report.severity <= 1 ? Severity::kError : Severity::kWarning,
+                   Wording(report));
         }
     }
     gStandardInput = nullptr;
-    if (stream) {
-        DKClose(stream);
-        out.files.insert(Canonical(path));
-    } else {
-        out.files.insert(kStandardInputName);
-    }
-    out.reports = ReportCount() - before;
     return true;
+}
+
+std::vector<std::string> FilesRead(const TreeFile& file) {
+    std::vector<std::string> files;
+    if (file.name == kStandardInputName) {
+        // A buffer is no file the reader opens; its includes are.
+        files.push_back(kStandardInputName);
+    }
+    files.insert(files.end(), file.log.Files().begin(), file.log.Files().end());
+    return files;
+}
+
+std::string SourceName(const TreeFile& file, const PTNSourceFile& source) {
+    return source.includedBy ? source.name : file.name;
 }
 
 const char* TypeKeyword(const DWXParseTreeNode& node) {
