@@ -11,13 +11,13 @@
 #include <string.h>
 
 #include <algorithm>
+#include <map>
 #include <vector>
 
 namespace dwxtree {
 
 namespace {
 
-int gReports = 0;
 // While standard input is read: its text, for the lines that reports show.
 const std::string* gStandardInput = nullptr;
 
@@ -43,37 +43,47 @@ std::string OneLine(const char* text) {
     return line;
 }
 
-// Collects line `want` (counted from 1) of a text fed in pieces, at most
-// kShown bytes of it.
+// Collects some lines (counted from 1) of a text fed in pieces, at most
+// kShown bytes of each, in one pass over the text.
 class LineFinder {
   public:
     static constexpr size_t kShown = 160;
-    explicit LineFinder(int want) : nWant(want) {}
-    // False once the line is complete.
+    // `want` holds the line numbers in any order; repeats are allowed.
+    explicit LineFinder(std::vector<int> want) : oWant(std::move(want)) {
+        std::sort(oWant.begin(), oWant.end());
+        oWant.erase(std::unique(oWant.begin(), oWant.end()), oWant.end());
+        oTexts.resize(oWant.size());
+        oFound.resize(oWant.size());
+    }
+    // False once every wanted line is complete.
     bool Feed(const char* bytes, size_t size) {
         const char* end = bytes + size;
-        while (bytes < end && nCurrent <= nWant) {
+        while (bytes < end && nNext < oWant.size()) {
             const char* newline = static_cast<const char*>(memchr(bytes, '\n', end - bytes));
             const char* stop = newline ? newline : end;
-            if (nCurrent == nWant) {
-                size_t room = kShown + 1 - std::min(oText.size(), kShown + 1);
-                oText.append(bytes, std::min(static_cast<size_t>(stop - bytes), room));
-                bFound = true;
+            bool wanted = nCurrent == oWant[nNext];
+            if (wanted) {
+                std::string& text = oTexts[nNext];
+                size_t room = kShown + 1 - std::min(text.size(), kShown + 1);
+                text.append(bytes, std::min(static_cast<size_t>(stop - bytes), room));
+                oFound[nNext] = true;
             }
             if (newline) {
+                nNext += wanted ? 1 : 0;
                 ++nCurrent;
             }
             bytes = newline ? newline + 1 : end;
         }
-        return nCurrent <= nWant;
+        return nNext < oWant.size();
     }
     // The line without its line end, cut to kShown bytes with "..."; empty
-    // when the text has no such line.
-    std::string Text() const {
-        if (!bFound) {
+    // when the text has no such line or it was not wanted. O(log wanted).
+    std::string Text(int line) const {
+        auto at = std::lower_bound(oWant.begin(), oWant.end(), line);
+        if (at == oWant.end() || *at != line || !oFound[at - oWant.begin()]) {
             return std::string();
         }
-        std::string text = oText;
+        std::string text = oTexts[at - oWant.begin()];
         if (text.size() > kShown) {
             text.resize(kShown);
             text += "...";
@@ -84,34 +94,47 @@ class LineFinder {
     }
 
   private:
-    int nWant;
+    std::vector<int> oWant;  // ascending, each once
+    std::vector<std::string> oTexts;
+    std::vector<bool> oFound;
+    size_t nNext = 0;  // the first wanted line not yet complete
     int nCurrent = 1;
-    bool bFound = false;
-    std::string oText;
 };
 
-std::string LineOf(const std::string& file, int line) {
-    if (line <= 0 || file.empty()) {
-        return std::string();
-    }
-    LineFinder finder(line);
+// Reads the wanted lines of `file` (standard input's text while it is
+// read) in one pass: O(size of the file) for any number of lines.
+LineFinder LinesOf(const std::string& file, std::vector<int> lines) {
+    LineFinder finder(std::move(lines));
     if (gStandardInput && file == kStandardInputName) {
         finder.Feed(gStandardInput->data(), gStandardInput->size());
-        return finder.Text();
+        return finder;
     }
-    if (!UnreadableReason(file, true).empty()) {
-        return std::string();
-    }
-    FILE* stream = fopen(file.c_str(), "rb");
+    FILE* stream =
+        !file.empty() && UnreadableReason(file, true).empty() ? fopen(file.c_str(), "rb") : nullptr;
     if (!stream) {
-        return std::string();
+        return finder;
     }
     char chunk[65536];
     size_t got;
     while ((got = fread(chunk, 1, sizeof chunk, stream)) > 0 && finder.Feed(chunk, got)) {
     }
     fclose(stream);
-    return finder.Text();
+    return finder;
+}
+
+void PrintReport(const std::string& file, int line, Severity severity, const std::string& message,
+                 const std::string& text) {
+    const char* kind = severity == Severity::kError ? "error" : "warning";
+    if (file.empty()) {
+        fprintf(stderr, "dwxtree: %s: %s\n", kind, message.c_str());
+    } else if (line <= 0) {
+        fprintf(stderr, "%s: %s: %s\n", file.c_str(), kind, message.c_str());
+    } else {
+        fprintf(stderr, "%s:%d: %s: %s\n", file.c_str(), line, kind, message.c_str());
+        if (!text.empty()) {
+            fprintf(stderr, " %5d | %s\n", line, text.c_str());
+        }
+    }
 }
 
 // The text after `marker` up to the next quote: the file a report of an
@@ -173,26 +196,9 @@ void InstallReportHandler() {
     IMPSetErrorHandler(OnReport);
 }
 
-int ReportCount() {
-    return gReports;
-}
-
 void Report(const std::string& file, int line, Severity severity, const std::string& message) {
-    ++gReports;
-    const char* kind = severity == Severity::kError ? "error" : "warning";
-    if (file.empty()) {
-        fprintf(stderr, "dwxtree: %s: %s\n", kind, message.c_str());
-        return;
-    }
-    if (line <= 0) {
-        fprintf(stderr, "%s: %s: %s\n", file.c_str(), kind, message.c_str());
-        return;
-    }
-    fprintf(stderr, "%s:%d: %s: %s\n", file.c_str(), line, kind, message.c_str());
-    std::string text = LineOf(file, line);
-    if (!text.empty()) {
-        fprintf(stderr, " %5d | %s\n", line, text.c_str());
-    }
+    std::string text = line > 0 ? LinesOf(file, {line}).Text(line) : std::string();
+    PrintReport(file, line, severity, message, text);
 }
 
 void Complain(const std::string& message) {
@@ -230,18 +236,33 @@ bool ReadTreeFile(const std::string& path, TreeFile& out) {
     }
 
     // Every report of the read, then every warning, each at its own file
-    // and line.
-    gStandardInput = standardInput ? &out.text : nullptr;
-    for (const auto* list : {&out.log.Reports(), &out.log.Warnings()}) {
+    // and line. The lines they show are read in one pass per file, as a
+    // file may have a warning on each of its lines.
+    const auto lists = {&out.log.Reports(), &out.log.Warnings()};
+    auto nameOf = [&](const PTNReadReport& report) {
+        return standardInput && report.file == kReaderBufferName ? std::string(kStandardInputName)
+                                                                 : report.file;
+    };
+    std::map<std::string, std::vector<int>> wanted;
+    for (const auto* list : lists) {
         for (const PTNReadReport& report : *list) {
-            std::string file = standardInput && report.file == kReaderBufferName
-                                   ? std::string(kStandardInputName)
-                                   : report.file;
-            Report(file, report.line, report.severity <= 1 ? Severity::kError : Severity::kWarning,
-                   Wording(report));
+            wanted[nameOf(report)].push_back(report.line);
         }
     }
+    gStandardInput = standardInput ? &out.text : nullptr;
+    std::map<std::string, LineFinder> lines;
+    for (auto& [file, numbers] : wanted) {
+        lines.emplace(file, LinesOf(file, std::move(numbers)));
+    }
     gStandardInput = nullptr;
+    for (const auto* list : lists) {
+        for (const PTNReadReport& report : *list) {
+            std::string file = nameOf(report);
+            PrintReport(file, report.line,
+                        report.severity <= 1 ? Severity::kError : Severity::kWarning,
+                        Wording(report), lines.at(file).Text(report.line));
+        }
+    }
     return true;
 }
 

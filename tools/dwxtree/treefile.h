@@ -18,13 +18,11 @@ enum class Severity { kError, kWarning };
 // Prints one problem on stderr as "FILE:LINE: error: MESSAGE" (or
 // "warning"); without a line, "FILE: error: MESSAGE"; without a file,
 // "dwxtree: error: MESSAGE". When the line of the file can be read, its
-// text follows on a second line, as compilers show it. Counts the report.
+// text follows on a second line, as compilers show it.
 // Showing the line rereads the file up to it: O(size of the file).
 void Report(const std::string& file, int line, Severity severity, const std::string& message);
-// A problem of the tool itself (no file), counted like the others.
+// A problem of the tool itself (no file).
 void Complain(const std::string& message);
-// The number of reports since the program started.
-int ReportCount();
 
 // Routes what the library reports outside a read (IMPError) to Report.
 // Reads report to their own log instead. Installed once by main.

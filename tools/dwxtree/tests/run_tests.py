@@ -258,6 +258,12 @@ def warnings(tmp):
     for path, value in [("t/a[1]", "2\n"), ("t/A[0]", "1\n"), ("t/b[0]", "3\n")]:
         expect("get " + path, ["get", "names.cfg", path], tmp, 0, out=value)
     expect("get index beyond", ["get", "names.cfg", "t/a[2]"], tmp, 1, err=r"no 't/a\[2\]'")
+    # A warning on every line (the writer writes IntegerList, the reader
+    # skips it): each shown with its text, and the file is not reread per
+    # warning, or this would not finish.
+    write(tmp, {"lists.cfg": "".join("(v%d IntegerList 1 2)\n" % i for i in range(100000))})
+    expect("a warning per line", ["check", "lists.cfg"], tmp, 1,
+           out_has=["not ok, 0 errors, 100000 warnings"], err=r"\n 99999 \| \(v99998 IntegerList")
 
 
 def json_escapes(tmp):
