@@ -26,7 +26,7 @@ const char kUsage[] =
     "usage: dwxtree SUBCOMMAND [OPTION]... OPERAND...\n"
     "\n"
     "  show FILE [-o OUT]                  the tree as the library writes it\n"
-    "  check FILE [--name NAME]            problems, or a summary; the files read\n"
+    "  check FILE [--name NAME]            problems; a summary and the files read\n"
     "  get FILE PATH [--where] [-o OUT]    the value at PATH (names separated by '/')\n"
     "  merge BASE OTHER [--except NAME]... [-o OUT]\n"
     "                                      OTHER's values merged into BASE\n"
