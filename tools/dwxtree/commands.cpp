@@ -63,7 +63,7 @@ int Finish(int code, Output& output) {
 }
 
 int DataCode(const TreeFile& file) {
-    return file.reports > 0 ? kExitData : kExitOk;
+    return file.log.Ok() ? kExitOk : kExitData;
 }
 
 struct Shape {
@@ -138,6 +138,21 @@ void PrintValue(FILE* stream, DWXParseTreeNode* node) {
     }
 }
 
+// The place the reader built `node` from, "FILE:LINE", then one line
+// "  included from FILE:LINE" per include directive that led there, the
+// innermost first. O(depth of the include chain).
+void PrintWhere(FILE* stream, const TreeFile& file, const DWXParseTreeNode& node) {
+    const PTNSourceFile* source = node.GetSourceFile();
+    if (!source) {
+        return;  // a node the reader did not build has no place
+    }
+    fprintf(stream, "%s:%d\n", SourceName(file, *source).c_str(), node.GetSourceLine());
+    for (; source->includedBy; source = source->includedBy) {
+        fprintf(stream, "  included from %s:%d\n", SourceName(file, *source->includedBy).c_str(),
+                source->includedAtLine);
+    }
+}
+
 // Reads the file named by the first operand and prints it with `print`.
 int PrintTreeFile(const Arguments& args, void (*print)(FILE*, const PTNSubTree&)) {
     TreeFile file;
@@ -178,29 +193,42 @@ int RunShow(const Arguments& args) {
 int RunCheck(const Arguments& args) {
     const std::string& path = args.Operands()[1];
     TreeFile file;
-    if (!ReadTreeFile(path, file, true)) {
+    if (!ReadTreeFile(path, file)) {
         return kExitData;
     }
-    bool valid = true;
+    int errors = 0;
+    int warnings = static_cast<int>(file.log.Warnings().size());
+    for (const PTNReadReport& report : file.log.Reports()) {
+        ++(report.severity <= 1 ? errors : warnings);
+    }
     if (args.Has("name")) {
         std::string name = args.Values("name")[0];
-        valid = OpensSubtree(file, path, name);
-        if (!valid) {
+        if (!OpensSubtree(file, path, name)) {
+            ++errors;
             Report(file.name, 0, Severity::kError,
                    "the first line that is not empty or a comment does not open a subtree "
                    "named " +
                        Quote(name));
         }
     }
+    // A warning means the tree differs from the text (a line dropped, a
+    // value read otherwise than it looks): such a file is not ok.
     Output output;
     OpenOutput(args, output);
-    if (!valid || file.reports > 0) {
-        return Finish(kExitData, output);
+    std::vector<std::string> files = FilesRead(file);
+    bool ok = errors == 0 && warnings == 0;
+    if (ok) {
+        Shape shape = Measure(*file.root);
+        printf("%s: ok, %ld nodes, %ld subtrees, depth %ld, %zu files read\n", file.name.c_str(),
+               shape.nodes, shape.subtrees, shape.depth, files.size());
+    } else {
+        printf("%s: not ok, %d error%s, %d warning%s, %zu files read\n", file.name.c_str(), errors,
+               errors == 1 ? "" : "s", warnings, warnings == 1 ? "" : "s", files.size());
     }
-    Shape shape = Measure(*file.root);
-    printf("%s: ok, %ld nodes, %ld subtrees, depth %ld, %zu files read\n", file.name.c_str(),
-           shape.nodes, shape.subtrees, shape.depth, file.files.size());
-    return Finish(kExitOk, output);
+    for (const std::string& name : files) {
+        printf("  %s\n", name.c_str());
+    }
+    return Finish(ok ? kExitOk : kExitData, output);
 }
 
 int RunGet(const Arguments& args) {
@@ -215,6 +243,7 @@ int RunGet(const Arguments& args) {
     if (!ReadTreeFile(args.Operands()[1], file)) {
         return kExitData;
     }
+    // One step at a time, so that a failure can say where the path ended.
     DWXParseTreeNode* node = file.root.get();
     std::string walked;
     for (const std::string& name : names) {
@@ -225,7 +254,12 @@ int RunGet(const Arguments& args) {
                        ", not a SubTree");
             return kExitData;
         }
-        node = subtree->GetChild(name.c_str());
+        // "name[N]" is the N-th child of that name; a name that holds
+        // brackets of its own is still found as written.
+        node = subtree->Find(name.c_str());
+        if (!node && name.find('[') != std::string::npos) {
+            node = subtree->GetChild(name.c_str());
+        }
         walked += (walked.empty() ? "" : "/") + name;
         if (!node) {
             Report(file.name, 0, Severity::kError, Quote(path) + " not found: no " + Quote(walked));
@@ -237,6 +271,9 @@ int RunGet(const Arguments& args) {
         return kExitData;
     }
     PrintValue(output.Stream(), node);
+    if (args.Has("where")) {
+        PrintWhere(output.Stream(), file, *node);
+    }
     return Finish(DataCode(file), output);
 }
 
@@ -252,7 +289,7 @@ int RunMerge(const Arguments& args) {
     if (!ReadTreeFile(basePath, base) || !ReadTreeFile(otherPath, other)) {
         return kExitData;
     }
-    if (base.reports > 0 || other.reports > 0) {
+    if (!base.log.Ok() || !other.log.Ok()) {
         // A merge of a partly read file would write a partial configuration.
         Complain("nothing written: the input had problems");
         return kExitData;

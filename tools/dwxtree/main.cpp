@@ -26,8 +26,8 @@ const char kUsage[] =
     "usage: dwxtree SUBCOMMAND [OPTION]... OPERAND...\n"
     "\n"
     "  show FILE [-o OUT]                  the tree as the library writes it\n"
-    "  check FILE [--name NAME]            reports, or a one-line summary\n"
-    "  get FILE PATH [-o OUT]              the value at PATH (names separated by '/')\n"
+    "  check FILE [--name NAME]            problems; a summary and the files read\n"
+    "  get FILE PATH [--where] [-o OUT]    the value at PATH (names separated by '/')\n"
     "  merge BASE OTHER [--except NAME]... [-o OUT]\n"
     "                                      OTHER's values merged into BASE\n"
     "  json FILE [-o OUT]                  the tree as JSON\n"
@@ -37,28 +37,33 @@ const char kUsage[] =
     "  --version      the version of dwxtree and its library\n"
     "\n"
     "Options and operands may come in any order. Each option has a single-\n"
-    "hyphen spelling (-o, -name, -except, -e or -encode, -d or -decode, -h or\n"
-    "-help) and a double-hyphen one (--output, --name, --except, --encode,\n"
-    "--decode, --help); the double-hyphen one also takes its value after '='\n"
-    "(--output=merged.cfg). '--' ends the options: every argument after it is\n"
-    "an operand, whatever its first character. A FILE of '-' is standard\n"
-    "input, an OUT of '-' standard output. File names are used byte for byte.\n"
+    "hyphen spelling (-o, -name, -except, -where, -e or -encode, -d or -decode,\n"
+    "-h or -help) and a double-hyphen one (--output, --name, --except, --where,\n"
+    "--encode, --decode, --help); the double-hyphen one also takes its value\n"
+    "after '=' (--output=merged.cfg). '--' ends the options: every argument\n"
+    "after it is an operand, whatever its first character. A FILE of '-' is\n"
+    "standard input, an OUT of '-' standard output. File names are used byte\n"
+    "for byte.\n"
     "\n"
     "-o OUT replaces OUT only when the command succeeds: the result goes to a\n"
     "temporary file in OUT's directory, which is then renamed over OUT, so OUT\n"
     "is never half-written and may be one of the input files. Without -o the\n"
     "result goes to standard output.\n"
     "\n"
-    "Includes in FILE are found as the library finds them (as named, then in\n"
-    "the directories of DWX_ETC_PATH, then DWX_PRO_PATH); dwxtree appends the\n"
-    "directory of FILE to DWX_ETC_PATH while it reads FILE. A FILE must be a\n"
-    "regular file, since the library reads it by name; use '-' for a pipe.\n"
+    "Includes are found as the library finds them with its includer search\n"
+    "on, which dwxtree turns on: a relative name first in the directory of the\n"
+    "file that holds the include, then as named (from the working directory),\n"
+    "then in the directories of DWX_ETC_PATH, then DWX_PRO_PATH. A FILE must\n"
+    "be a regular file, since the library reads it by name; use '-' for a pipe.\n"
     "\n"
     "Problems are reported on standard error as 'FILE:LINE: error: MESSAGE'\n"
-    "(or 'warning'), followed by the text of that line.\n"
+    "(or 'warning'), followed by the text of that line. A warning is either a\n"
+    "skipped include or a line the reader drops or reads otherwise than it\n"
+    "looks (an unknown type keyword, a stray ')', '( name', Integer 12abc).\n"
     "\n"
     "Exit status: 0 success; 1 the data had problems (a report from the reader,\n"
-    "a path not found, a file that cannot be read or written); 2 usage errors.\n";
+    "for check also a warning, a path not found, a file that cannot be read or\n"
+    "written); 2 usage errors.\n";
 
 // Every option of every subcommand; a subcommand lists the keys it takes.
 const std::vector<OptionRule> kOptions = {
@@ -69,6 +74,7 @@ const std::vector<OptionRule> kOptions = {
     {"except", "-except --except", Takes::kValues, true},
     {"encode", "-e -encode --encode", Takes::kNothing, false},
     {"decode", "-d -decode --decode", Takes::kNothing, false},
+    {"where", "-where --where", Takes::kNothing, false},
 };
 
 struct Subcommand {
@@ -105,27 +111,44 @@ const Subcommand kSubcommands[] = {
      "\n"
      "Reads FILE in full. With --name, also tests that the first line of FILE\n"
      "that is neither empty nor a comment opens a subtree named NAME (case\n"
-     "ignored). Every report is printed on standard error with its file and\n"
-     "line; when there is none, one line on standard output says\n"
+     "ignored). Every error and warning is printed on standard error with its\n"
+     "file and line. On standard output, when there is none:\n"
      "  FILE: ok, N nodes, S subtrees, depth D, F files read\n"
-     "where N counts every node (subtrees included), D is the number of levels\n"
-     "(a node outside every subtree is at level 1) and F counts the distinct\n"
-     "files read, FILE and its includes. Exit status 0 only when nothing was\n"
-     "reported.\n"},
+     "where N counts every node (subtrees included) and D is the number of\n"
+     "levels (a node outside every subtree is at level 1); otherwise:\n"
+     "  FILE: not ok, E errors, W warnings, F files read\n"
+     "Either line is followed by the F files read, FILE and the includes it\n"
+     "opened, one per line indented by two blanks, in the order first read,\n"
+     "each once, named as the reader found them. Exit status 0 only when\n"
+     "nothing was reported: a warning means the tree read differs from the\n"
+     "text, so that file is not ok either.\n"},
     {"get",
      2,
      0,
-     {"output"},
+     {"output", "where"},
      dwxtree::RunGet,
-     "usage: dwxtree get FILE PATH [-o OUT]\n"
+     "usage: dwxtree get FILE PATH [--where] [-o OUT]\n"
      "\n"
      "PATH is names separated by '/', starting from the top level of FILE, for\n"
      "example app/window/title. Each name is matched as the library matches\n"
-     "names: whole, ASCII case ignored, the first child of that name wins.\n"
+     "names: whole, ASCII case ignored, the first child of that name wins;\n"
+     "NAME[N] takes the N-th child of that name instead, counting from 0\n"
+     "(app/plugin[1]). A name that itself ends in brackets is still found.\n"
      "Prints the value: a String as its text without quotes, a StringList or a\n"
      "numeric list one entry per line, a SubTree as the library writes it,\n"
      "every other value as the text the file format uses. Exit status 1 when\n"
-     "the path is not found.\n"},
+     "the path is not found.\n"
+     "\n"
+     "--where (or -where) adds, after the value, where it was read: a line\n"
+     "FILE:LINE, then for a value from an included file one line per include\n"
+     "that led there, innermost first, each '  included from FILE:LINE' naming\n"
+     "the include directive. For example:\n"
+     "  1280\n"
+     "  conf/window.cfg:3\n"
+     "    included from conf/viewer.cfg:5\n"
+     "    included from app.cfg:2\n"
+     "File names are the ones the reader used (relative to the working\n"
+     "directory when found next to a relative includer).\n"},
     {"merge",
      2,
      0,
@@ -217,6 +240,9 @@ int UsageError(const std::string& message, const char* subcommand) {
 
 int main(int argc, char** argv) {
     dwxtree::InstallReportHandler();
+    // Includes named relative to the file that holds them are found from
+    // any working directory.
+    PTNSubTree::SetIncludeSearchNextToIncluder(true);
     dwxtree::IgnoreFileSizeSignal();
 
     Arguments args;

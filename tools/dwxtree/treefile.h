@@ -8,8 +8,8 @@
 #include <stdio.h>
 
 #include <memory>
-#include <set>
 #include <string>
+#include <vector>
 
 namespace dwxtree {
 
@@ -18,15 +18,14 @@ enum class Severity { kError, kWarning };
 // Prints one problem on stderr as "FILE:LINE: error: MESSAGE" (or
 // "warning"); without a line, "FILE: error: MESSAGE"; without a file,
 // "dwxtree: error: MESSAGE". When the line of the file can be read, its
-// text follows on a second line, as compilers show it. Counts the report.
+// text follows on a second line, as compilers show it.
 // Showing the line rereads the file up to it: O(size of the file).
 void Report(const std::string& file, int line, Severity severity, const std::string& message);
-// A problem of the tool itself (no file), counted like the others.
+// A problem of the tool itself (no file).
 void Complain(const std::string& message);
-// The number of reports since the program started.
-int ReportCount();
 
-// Routes the library's reports (IMPError) to Report. Installed once by main.
+// Routes what the library reports outside a read (IMPError) to Report.
+// Reads report to their own log instead. Installed once by main.
 void InstallReportHandler();
 
 // The name that standard input has in messages.
@@ -40,22 +39,28 @@ struct TreeFile {
     std::string name;
     // Standard input's text, kept for PTNValidateFile and report lines.
     std::string text;
-    // The files that took part (the file itself and every include that was
-    // found), by canonical path; filled only when asked for.
-    std::set<std::string> files;
-    // Reports that arose while reading (corrupt lines, missing includes,
-    // include cycles).
-    int reports = 0;
+    // What the read met: its reports (corrupt lines, includes missing or
+    // refused), its warnings (lines dropped or read otherwise than they
+    // look) and the files it opened.
+    PTNReadLog log;
 };
 
-// Reads `path` ("-" is standard input) with the library's reader. The
-// directory of `path` is appended to the "etc" search path (DWX_ETC_PATH)
-// while reading, so includes named relative to it are found. A corrupt line
-// at the outermost level is reported like every other and ends the reading;
-// what was read before it stays. Returns false, after a report that says
-// why, only when the file cannot be read at all: it must be a readable
-// regular file, since the reader reads it by name.
-bool ReadTreeFile(const std::string& path, TreeFile& out, bool listFiles = false);
+// Reads `path` ("-" is standard input) with the library's reader and prints
+// every report and warning of the read through Report. A corrupt line at
+// the outermost level ends the reading; what was read before it stays.
+// Returns false, after a report that says why, only when the file cannot be
+// read at all: it must be a readable regular file, since the reader reads
+// it by name.
+bool ReadTreeFile(const std::string& path, TreeFile& out);
+
+// The files the read took part in, as the reader named them: the file
+// itself first (kStandardInputName for standard input), then each include
+// it opened, once each, in the order first opened.
+std::vector<std::string> FilesRead(const TreeFile& file);
+
+// The name of a node's source file in messages: the top-level source is
+// the file's own name (so standard input is kStandardInputName).
+std::string SourceName(const TreeFile& file, const PTNSourceFile& source);
 
 // Writes the top-level nodes of `root` as the library writes them: a
 // subtree through WriteToFile, a leaf as one line "(name Type value)".

@@ -83,9 +83,11 @@ def examples(tmp):
     write(tmp, {"shown.cfg": shown})
     expect("show round trip", ["show", "shown.cfg"], tmp, 0, out=shown.decode())
 
-    summary = "%s: ok, 31 nodes, 6 subtrees, depth 4, 3 files read\n"
-    expect("check example", ["check", APP, "-name", "VIEWER"], tmp, 0, out=summary % APP)
-    expect("check wrong name", ["check", APP, "-name", "view"], tmp, 1, out="",
+    summary = "%s: ok, 31 nodes, 6 subtrees, depth 4, 3 files read\n  %s\n  %s\n  %s\n" % (
+        APP, APP, os.path.join(EXAMPLES, "network.cfg"), os.path.join(EXAMPLES, "plugins.cfg"))
+    expect("check example", ["check", APP, "-name", "VIEWER"], tmp, 0, out=summary)
+    expect("check wrong name", ["check", APP, "-name", "view"], tmp, 1,
+           out_has=[": not ok, 1 error, 0 warnings, 3 files read\n"],
            err=r"does not open a subtree named 'view'")
 
     for path, value in [
@@ -165,19 +167,20 @@ def broken(tmp):
     expect("merge refuses", ["merge", "nested.cfg", "top.cfg"], tmp, 1, out="",
            err=r"nothing written")
 
-    expect("missing include", ["check", "missing.cfg"], tmp, 1, out="",
+    expect("missing include", ["check", "missing.cfg"], tmp, 1,
+           out="missing.cfg: not ok, 0 errors, 1 warning, 1 files read\n  missing.cfg\n",
            err=r"^missing\.cfg:2: warning: cannot find include file 'nowhere\.cfg'; ignored\n"
                r"     2 \|   \(@include nowhere\.cfg\)\n$")
     expect("missing include kept reading", ["show", "missing.cfg"], tmp, 1,
            out="(t SubTree\n  (x Integer 1)\n)\n", err="cannot find include")
     expect("optional include", ["check", "optional.cfg"], tmp, 0,
-           out="optional.cfg: ok, 2 nodes, 1 subtrees, depth 2, 1 files read\n")
+           out="optional.cfg: ok, 2 nodes, 1 subtrees, depth 2, 1 files read\n  optional.cfg\n")
     expect("self include", ["show", "self.cfg"], tmp, 1, out="(s SubTree\n  (x Integer 1)\n)\n",
            err=r"^self\.cfg:2: warning: include cycle: 'self\.cfg' is already being read")
     expect("include cycle", ["show", "cycle_a.cfg"], tmp, 1,
            out="(a Integer 1)\n(b Integer 2)\n", err=r"^cycle_b\.cfg:2: warning: include cycle")
     write(tmp, {"chain%d.cfg" % i: "(@include chain%d.cfg)\n" % (i + 1) for i in range(70)})
-    expect("include depth", ["check", "chain0.cfg"], tmp, 1, out="",
+    expect("include depth", ["check", "chain0.cfg"], tmp, 1, out_has=["65 files read"],
            err=r"^chain64\.cfg:1: warning: include depth limit of 64 reached at 'chain65\.cfg'; "
                r"ignored\n     1 \| \(@include chain65\.cfg\)\n$")
 
@@ -205,10 +208,10 @@ def unreadable(tmp):
 
 
 def includes(tmp):
-    # Includes are found as named, then through DWX_ETC_PATH and DWX_PRO_PATH;
-    # dwxtree adds the directory of FILE to the "etc" search, and $NAME in an
-    # include is expanded from the environment. A file included twice (a
-    # diamond) is read twice but counted once.
+    # A relative include is found next to the file that holds it, from any
+    # working directory, before the working directory itself; then through
+    # DWX_ETC_PATH and DWX_PRO_PATH; $NAME is expanded from the environment.
+    # A file included twice (a diamond) is read twice but listed once.
     write(tmp, {
         "conf/main.cfg": "(m SubTree\n  (@include a.cfg)\n  (@include b.cfg)\n"
                          "  (@include $PARTS/p.cfg)\n  (@include pro.cfg)\n)\n",
@@ -217,12 +220,50 @@ def includes(tmp):
         "conf/c.cfg": "(c Integer 3)\n",
         "parts/p.cfg": "(p Integer 4)\n",
         "prodir/pro.cfg": "(q Integer 5)\n",
+        "conf/top.cfg": "(app SubTree\n  (@include deep/mid.cfg)\n)\n",
+        "conf/deep/mid.cfg": "(mid SubTree\n  (x Integer 1)\n  (@include leaf.cfg)\n)\n",
+        "conf/deep/leaf.cfg": "# the leaf\n(width Integer 800)\n",
+        "run/leaf.cfg": "(width Integer 1)\n",  # the working directory's: not the neighbour
     })
     env = {"PARTS": os.path.join(tmp, "parts"), "DWX_PRO_PATH": os.path.join(tmp, "prodir")}
     expect("include search", ["check", "conf/main.cfg"], tmp, 0, env_extra=env,
-           out="conf/main.cfg: ok, 7 nodes, 3 subtrees, depth 3, 6 files read\n")
+           out="conf/main.cfg: ok, 7 nodes, 3 subtrees, depth 3, 6 files read\n"
+               "  conf/main.cfg\n  conf/a.cfg\n  conf/c.cfg\n  conf/b.cfg\n"
+               "  %s/parts/p.cfg\n  %s/prodir/pro.cfg\n" % (tmp, tmp))
     expect("include search values", ["get", "conf/main.cfg", "m/b/c"], tmp, 0,
            env_extra=env, out="3\n")
+    run_dir = os.path.join(tmp, "run")
+    expect("where through two includes", ["get", "../conf/top.cfg", "APP/mid/width", "--where"],
+           run_dir, 0, out="800\n../conf/deep/leaf.cfg:2\n  included from ../conf/deep/mid.cfg:3\n"
+                          "  included from ../conf/top.cfg:2\n")
+    expect("where of a subtree", ["get", "../conf/top.cfg", "app/mid", "-where"], run_dir, 0,
+           out_has=[")\n../conf/deep/mid.cfg:1\n  included from ../conf/top.cfg:2\n"])
+    expect("where in standard input", ["get", "-", "t/b", "--where"], tmp, 0,
+           stdin=b"(t SubTree\n  (a Integer 1)\n  (b Integer 2)\n)\n", out="2\n<stdin>:3\n")
+
+
+def warnings(tmp):
+    # Lines the reader drops or reads otherwise than they look are warnings
+    # at their own file and line; check fails on them, the others do not.
+    write(tmp, {"w.cfg": "(t SubTree\n  (port Integr 8080)\n  (n Integer 12abc)\n"
+                         "  (@include wi.cfg)\n)\n",
+                "wi.cfg": '(d Double 1.5x)\n(s String "a" "b")\n',
+                "names.cfg": "(t SubTree\n  (a Integer 1)\n  (A Integer 2)\n  (b[0] Integer 3)\n)\n"})
+    shown = (r"(?s)^w\.cfg:2: warning: type keyword 'Integr' builds no node.*\n     2 \|   "
+             r"\(port Integr 8080\)\n.*w\.cfg:3: warning: integer value '12abc'.*"
+             r"wi\.cfg:1: warning: double value '1\.5x'.*wi\.cfg:2: warning: string value")
+    expect("check warnings", ["check", "w.cfg"], tmp, 1, err=shown,
+           out="w.cfg: not ok, 0 errors, 4 warnings, 2 files read\n  w.cfg\n  wi.cfg\n")
+    expect("show warnings", ["show", "w.cfg"], tmp, 0, err=shown, out_has=["(n Integer 12)"])
+    for path, value in [("t/a[1]", "2\n"), ("t/b[0]", "3\n")]:
+        expect("get " + path, ["get", "names.cfg", path], tmp, 0, out=value)
+    expect("get index beyond", ["get", "names.cfg", "t/a[2]"], tmp, 1, err=r"no 't/a\[2\]'")
+    # A warning on every line (the writer writes IntegerList, the reader
+    # skips it): each shown with its text, and the file is not reread per
+    # warning, or this would not finish.
+    write(tmp, {"lists.cfg": "".join("(v%d IntegerList 1 2)\n" % i for i in range(100000))})
+    expect("a warning per line", ["check", "lists.cfg"], tmp, 1,
+           out_has=["not ok, 0 errors, 100000 warnings"], err=r"\n 99999 \| \(v99998 IntegerList")
 
 
 def json_escapes(tmp):
@@ -312,7 +353,7 @@ def depth(tmp):
     with open(os.path.join(tmp, "deep.cfg"), "w") as f:
         f.write("(a SubTree\n" * levels + ")\n" * levels + "(x Integer 5)\n")
     expect("deep check", ["check", "deep.cfg"], tmp, 0,
-           out="deep.cfg: ok, %d nodes, %d subtrees, depth %d, 1 files read\n"
+           out="deep.cfg: ok, %d nodes, %d subtrees, depth %d, 1 files read\n  deep.cfg\n"
                % (levels + 1, levels, levels))
     expect("deep get", ["get", "deep.cfg", "x"], tmp, 0, out="5\n")
     out = expect("deep json", ["json", "deep.cfg"], tmp, 0)
@@ -390,7 +431,7 @@ def edges(tmp):
         "other.cfg": "(t SubTree\n  (a Integer 5)\n  (s Integer 9)\n  (new Integer 3)\n)\n",
     })
     expect("empty file", ["check", "empty.cfg"], tmp, 0,
-           out="empty.cfg: ok, 0 nodes, 0 subtrees, depth 0, 1 files read\n")
+           out="empty.cfg: ok, 0 nodes, 0 subtrees, depth 0, 1 files read\n  empty.cfg\n")
     expect("empty json", ["json", "empty.cfg"], tmp, 0, out="{}\n")
     # Nodes outside every subtree are written one per line and read back.
     expect("top-level leaf", ["show", "leaf.cfg"], tmp, 0,
@@ -417,7 +458,7 @@ def habits(tmp):
     expect("stdin", ["get", "-", "t/p"], tmp, 0, stdin=open(os.path.join(tmp, odd), "rb").read(),
            out="2\n")
     expect("stdin check", ["check", "-", "--name", "T"], tmp, 0, stdin=b"(t SubTree\n)\n",
-           out="<stdin>: ok, 1 nodes, 1 subtrees, depth 1, 1 files read\n")
+           out="<stdin>: ok, 1 nodes, 1 subtrees, depth 1, 1 files read\n  <stdin>\n")
     expect("stdin merge", ["merge", odd, "-", "-o", "-"], tmp, 0,
            stdin=b"(t SubTree\n  (p Integer 3)\n)\n", out_has=["(p Integer 3)"])
     expect("after --", ["get", "--", "-odd.cfg", "x"], tmp, 0, out="1\n")
@@ -466,7 +507,7 @@ def usage(tmp):
 
 
 def main():
-    for group in (examples, broken, unreadable, includes, json_escapes, base64, base64_blocks,
+    for group in (examples, broken, unreadable, includes, warnings, json_escapes, base64, base64_blocks,
                   base64_large, depth, outputs, edges, habits, usage):
         with tempfile.TemporaryDirectory() as tmp:
             group(tmp)
