@@ -11,24 +11,43 @@
 #include <dwxcore/dwxcore_export.h>
 #include <dwxcore/dwxobject.h>
 
+#include <stddef.h>
 #include <stdio.h>
 
+#include <new>
 #include <string>
 
 class PTNSubTree;
 
 // Base of every node: a name owned by the node and a borrowed pointer to the
 // subtree that holds it (null until the node is added to one).
+//
+// Nodes created with new come from the library's node pool: blocks carved
+// from slabs of about 64 KB, each slab handed back to the C heap as soon as
+// the last node in it is deleted, whichever thread deletes it. Reading and
+// deleting a large tree thus costs a few hundred slabs instead of a heap
+// block per node. Deleting a single node with delete always works.
 class DWXCORE_API DWXParseTreeNode : public DWXObject {
   public:
     explicit DWXParseTreeNode(const char* name);
-    // Does not detach the node from its parent; the parent is the owner.
+    // A node that still has a parent takes itself out of that parent's
+    // children first, so deleting a child by hand leaves no dangling pointer.
     ~DWXParseTreeNode() override;
+
+    static void* operator new(size_t size);
+    static void* operator new(size_t size, const std::nothrow_t&) noexcept;
+    static void* operator new(size_t, void* where) noexcept { return where; }
+    static void operator delete(void* block, size_t size) noexcept;
+    static void operator delete(void* block, const std::nothrow_t&) noexcept;
+    static void operator delete(void*, void*) noexcept {}
 
     // Borrowed; valid until SetName or destruction.
     const char* GetName() const { return pcName; }
+    // The parent, if any, keeps its name lookups right.
     void SetName(const char* name);
     // Only records the pointer; it does not add the node to that subtree.
+    // The parent recorded must hold the node or be null: the destructor and
+    // SetName tell it.
     void SetParent(PTNSubTree* parent) { poParent = parent; }
     PTNSubTree* GetParentRef() const { return poParent; }
 
@@ -55,6 +74,10 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
     static constexpr size_t kShortName = 8;
     void InitName(const char* name);
     void FreeName();
+    // SetName without telling the parent.
+    void ReplaceName(const char* name);
+
+    friend class PTNSubTree;
 
     char* pcName;
     PTNSubTree* poParent;
@@ -200,7 +223,14 @@ class DWXCORE_API PTNString : public DWXParseTreeNode {
     // The reader's way to hand over a value it has already allocated.
     friend struct PTNStringAdopter;
 
+    // A value this short (its terminator included) is kept in the node
+    // itself, as short names are; pcValue points at whichever storage holds
+    // the value (null for a null value).
+    static constexpr size_t kShortValue = 16;
+    void FreeValue();
+
     char* pcValue;
+    char acShortValue[kShortValue];
 };
 
 // ---------------------------------------------------------------------------
@@ -371,15 +401,21 @@ class DWXCORE_API ExceptionList {
     void Append(const char* name);
     void Clear();
 
+    // The merge hashes the names once for its whole walk.
+    friend class PTNSubTree;
+
     char** ppcNames;
     int nCount;
     int nCapacity;
 };
 
 // The interior node: an ordered sequence of children of any class, owned and
-// deleted with the subtree. Lookups visit only the direct children, in order,
-// compare whole names ignoring case and take the first match; a null name
-// matches nothing.
+// deleted with the subtree. Lookups compare whole names ignoring case and
+// answer as a walk of the direct children in order would: the first match; a
+// null name matches nothing. A subtree of more than a handful of children
+// keeps a name index, built on the first lookup and kept up to date from then
+// on, so that a lookup by name costs O(1) plus the namesakes it passes, a
+// count O(1), and a merge O(children of both trees).
 class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
   public:
     explicit PTNSubTree(const char* name);
@@ -388,8 +424,10 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     PTNSubTree& operator=(const PTNSubTree& other);
     ~PTNSubTree() override;
 
-    // Appends the node and takes ownership; null is ignored. A node must not
-    // be added twice or to two subtrees.
+    // Appends the node and takes ownership; null is ignored. A node that
+    // another subtree (or this one) holds is moved: taken out there and
+    // appended here. The subtree itself and its ancestors are refused, since
+    // a tree cannot hold itself.
     void AddChild(DWXParseTreeNode* child);
     // Borrowed; for reading and iteration.
     const DWXArray* GetChildren() const { return &oChildren; }
@@ -465,9 +503,30 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     static int PTNValidateFile(FILE* stream, const char* name);
 
   private:
+    struct NameIndex;
+    friend class DWXParseTreeNode;
+    friend struct PTNTreeBuilder;
+
     void CopyChildrenFrom(const PTNSubTree& other);
+    // Appends a node that has no parent and is no ancestor (the reader's and
+    // the copy's new nodes).
+    void AppendChild(DWXParseTreeNode* child);
+    // Takes `child` out of the children without deleting it; nothing when it
+    // is not one of them.
+    void ForgetChild(DWXParseTreeNode* child);
+    // The child's name changes to `name`; the index follows.
+    void RenameChild(DWXParseTreeNode* child, const char* name);
+    // The index, built first when the subtree is large enough to want one;
+    // null for a small subtree.
+    NameIndex* Index() const;
+    void DropIndex();
+    // Deletes every child (each after its parent pointer is cleared, so none
+    // tries to take itself out) and empties the array.
+    void DestroyChildren();
 
     DWXArray oChildren;
+    // Owned; never shared with a copy. Built lazily by const lookups.
+    mutable NameIndex* poIndex;
 };
 
 // File validation: defined in dwxparse_validate.cpp.

@@ -2,8 +2,10 @@
 // and the exception list that steers the merge.
 #include <dwxcore/dwxparse.h>
 
+#include <services/portability.h>
 #include <services/rtprim.h>
 
+#include <stdint.h>
 #include <stdlib.h>
 
 #include <typeinfo>
@@ -16,6 +18,66 @@ namespace {
 bool NameMatches(const DWXParseTreeNode* node, const char* name) {
     return name != nullptr && node->GetName() != nullptr && _stricmp(node->GetName(), name) == 0;
 }
+
+// FNV-1a over the name with ASCII letters folded, so that two names that
+// _stricmp calls equal always hash alike.
+uint32_t FoldedHash(const char* name) {
+    uint32_t hash = 2166136261u;
+    for (const unsigned char* p = reinterpret_cast<const unsigned char*>(name); *p != '\0'; ++p) {
+        hash = (hash ^ AsciiLower(*p)) * 16777619u;
+    }
+    return hash;
+}
+
+// Subtrees with no more children than this are searched by a walk; a walk of
+// a few children is as quick as a hash and costs no memory.
+constexpr int kIndexFrom = 9;
+
+// The names of an exception list, hashed once for a whole merge; short
+// lists are searched as they are.
+class ExceptionSet {
+  public:
+    ExceptionSet(char* const* names, int count) : ppcNames(names), nCount(count) {
+        if (count <= 8) {
+            return;
+        }
+        size_t size = 16;
+        while (size < 2 * static_cast<size_t>(count)) {
+            size *= 2;
+        }
+        oSlots.assign(size, -1);
+        for (int i = 0; i < count; ++i) {
+            size_t slot = FoldedHash(names[i]) & (size - 1);
+            while (oSlots[slot] >= 0) {
+                slot = (slot + 1) & (size - 1);
+            }
+            oSlots[slot] = i;
+        }
+    }
+
+    bool Contains(const char* name) const {
+        if (oSlots.empty()) {
+            for (int i = 0; i < nCount; ++i) {
+                if (_stricmp(ppcNames[i], name) == 0) {
+                    return true;
+                }
+            }
+            return false;
+        }
+        const size_t mask = oSlots.size() - 1;
+        for (size_t slot = FoldedHash(name) & mask; oSlots[slot] >= 0; slot = (slot + 1) & mask) {
+            if (_stricmp(ppcNames[oSlots[slot]], name) == 0) {
+                return true;
+            }
+        }
+        return false;
+    }
+
+  private:
+    char* const* ppcNames;
+    int nCount;
+    std::vector<int> oSlots;  // indexes into the names; -1 for an empty slot
+};
 
 // A subtree of exactly this library's class. Deep trees are walked with
 // explicit work lists rather than recursion; only these subtrees are walked
@@ -88,11 +150,188 @@ void ExceptionList::Clear() {
 }
 
 // ---------------------------------------------------------------------------
+// PTNSubTree: the name index
+//
+// An open-addressing table with one entry per distinct name (folded), which
+// holds the slots of the first and last child of that name and their count;
+// the children of one name are chained in slot order through `next`. The
+// table refers to children by slot in the children array: slots never move
+// (taking a child out leaves an empty slot), so appending, renaming and
+// taking out touch only the chain of the names concerned.
+
+struct PTNSubTree::NameIndex {
+    static constexpr int32_t kEmpty = -1;
+    static constexpr int32_t kGone = -2;  // a name whose last child went
+    struct Entry {
+        uint32_t hash;
+        int32_t first;  // slot, kEmpty or kGone
+        int32_t last;
+        int32_t count;
+    };
+
+    explicit NameIndex(const DWXArray& children) : oChildren(children) { Rebuild(); }
+
+    const char* NameAt(int32_t slot) const {
+        return static_cast<DWXParseTreeNode*>(oChildren[slot])->GetName();
+    }
+
+    // The entry of that name, or null.
+    const Entry* Find(const char* name) const {
+        return const_cast<NameIndex*>(this)->FindEntry(name, FoldedHash(name));
+    }
+
+    Entry* FindEntry(const char* name, uint32_t hash) {
+        const size_t mask = oEntries.size() - 1;
+        for (size_t i = hash & mask;; i = (i + 1) & mask) {
+            Entry& entry = oEntries[i];
+            if (entry.first == kEmpty) {
+                return nullptr;
+            }
+            if (entry.first >= 0 && entry.hash == hash &&
+                _stricmp(NameAt(entry.first), name) == 0) {
+                return &entry;
+            }
+        }
+    }
+
+    // Records the child in `slot` under its name, in slot order among its
+    // namesakes: O(1) for the last slot, O(namesakes) otherwise.
+    void Insert(int32_t slot) {
+        const char* name = NameAt(slot);
+        if (name == nullptr) {
+            return;  // a null name is never found
+        }
+        if (static_cast<size_t>(slot) >= oNext.size()) {
+            oNext.resize(static_cast<size_t>(slot) + 1 + oNext.size() / 2, kEmpty);
+        }
+        const uint32_t hash = FoldedHash(name);
+        if (Entry* entry = FindEntry(name, hash)) {
+            ++entry->count;
+            if (slot > entry->last) {
+                oNext[static_cast<size_t>(entry->last)] = slot;
+                oNext[static_cast<size_t>(slot)] = kEmpty;
+                entry->last = slot;
+            } else if (slot < entry->first) {
+                oNext[static_cast<size_t>(slot)] = entry->first;
+                entry->first = slot;
+            } else {
+                int32_t at = entry->first;
+                while (oNext[static_cast<size_t>(at)] < slot) {
+                    at = oNext[static_cast<size_t>(at)];
+                }
+                oNext[static_cast<size_t>(slot)] = oNext[static_cast<size_t>(at)];
+                oNext[static_cast<size_t>(at)] = slot;
+            }
+            return;
+        }
+        if (4 * (nUsed + 1) > 3 * oEntries.size()) {
+            Rebuild();  // `slot` is in the array already, so this records it
+            return;
+        }
+        const size_t mask = oEntries.size() - 1;
+        size_t i = hash & mask;
+        while (oEntries[i].first >= 0) {  // a name's first gone entry is reused
+            i = (i + 1) & mask;
+        }
+        if (oEntries[i].first == kEmpty) {
+            ++nUsed;
+        }
+        oEntries[i] = {hash, slot, slot, 1};
+        oNext[static_cast<size_t>(slot)] = kEmpty;
+    }
+
+    // Takes the child in `slot`, named `name`, out of its chain; false when
+    // that slot is not in the chain of that name.
+    bool Remove(int32_t slot, const char* name) {
+        if (name == nullptr) {
+            return false;
+        }
+        Entry* entry = FindEntry(name, FoldedHash(name));
+        if (entry == nullptr) {
+            return false;
+        }
+        int32_t previous = kEmpty;
+        int32_t at = entry->first;
+        while (at != kEmpty && at != slot) {
+            previous = at;
+            at = oNext[static_cast<size_t>(at)];
+        }
+        if (at == kEmpty) {
+            return false;
+        }
+        const int32_t after = oNext[static_cast<size_t>(slot)];
+        if (previous == kEmpty) {
+            entry->first = after;
+        } else {
+            oNext[static_cast<size_t>(previous)] = after;
+        }
+        if (entry->last == slot) {
+            entry->last = previous;
+        }
+        if (--entry->count == 0) {
+            entry->first = kGone;
+        }
+        return true;
+    }
+
+    // The slot of `child`, found through the chain of its name; -1 when the
+    // child is not recorded.
+    int32_t SlotOf(const DWXParseTreeNode* child) const {
+        if (child->GetName() == nullptr) {
+            return -1;
+        }
+        const Entry* entry = Find(child->GetName());
+        for (int32_t at = entry ? entry->first : kEmpty; at != kEmpty;
+             at = oNext[static_cast<size_t>(at)]) {
+            if (oChildren[at] == child) {
+                return at;
+            }
+        }
+        return -1;
+    }
+
+    // Every child again, in slot order, in a table sized for twice as many.
+    void Rebuild() {
+        const int top = oChildren.GetMaxIndex();
+        size_t size = 16;
+        while (size < 2 * static_cast<size_t>(top) + 2) {
+            size *= 2;
+        }
+        oEntries.assign(size, Entry{0, kEmpty, kEmpty, 0});
+        oNext.assign(static_cast<size_t>(top) + 1, kEmpty);
+        nUsed = 0;
+        for (int32_t slot = 0; slot < top; ++slot) {
+            if (oChildren[slot] != nullptr) {
+                Insert(slot);
+            }
+        }
+    }
+
+    const DWXArray& oChildren;
+    std::vector<Entry> oEntries;  // size a power of two
+    std::vector<int32_t> oNext;   // by slot: the next slot of the same name
+    size_t nUsed = 0;             // entries not empty (gone ones included)
+};
+
+PTNSubTree::NameIndex* PTNSubTree::Index() const {
+    if (poIndex == nullptr && oChildren.GetCount() >= kIndexFrom) {
+        poIndex = new NameIndex(oChildren);
+    }
+    return poIndex;
+}
+
+void PTNSubTree::DropIndex() {
+    delete poIndex;
+    poIndex = nullptr;
+}
+
+// ---------------------------------------------------------------------------
 // PTNSubTree: ownership and copies
 
-PTNSubTree::PTNSubTree(const char* name) : DWXParseTreeNode(name), oChildren() {}
+PTNSubTree::PTNSubTree(const char* name) : DWXParseTreeNode(name), oChildren(), poIndex(nullptr) {}
 
-PTNSubTree::PTNSubTree(const PTNSubTree& other) : DWXParseTreeNode(other), oChildren() {
+PTNSubTree::PTNSubTree(const PTNSubTree& other)
+    : DWXParseTreeNode(other), oChildren(), poIndex(nullptr) {
     CopyChildrenFrom(other);
 }
 
@@ -104,10 +343,13 @@ PTNSubTree& PTNSubTree::operator=(const PTNSubTree& other) {
     // subtree and would go with them.
     PTNSubTree copy(other);
     DWXParseTreeNode::operator=(other);
-    oChildren.DestroyContents();
-    DWXIter iter(&copy.oChildren);
-    for (DWXObject* child = iter.Current(); child != nullptr; child = iter.Next()) {
-        AddChild(static_cast<DWXParseTreeNode*>(child));
+    DestroyChildren();
+    const int top = copy.oChildren.GetMaxIndex();
+    for (int i = 0; i < top; ++i) {
+        if (auto* child = static_cast<DWXParseTreeNode*>(copy.oChildren[i])) {
+            child->SetParent(nullptr);
+            AppendChild(child);
+        }
     }
     copy.oChildren.Empty();  // the children now belong to this subtree
     return *this;
@@ -134,9 +376,24 @@ PTNSubTree::~PTNSubTree() {
         listPlainChildren(*subtrees[i]);
     }
     for (auto subtree = subtrees.rbegin(); subtree != subtrees.rend(); ++subtree) {
-        (*subtree)->oChildren.DestroyContents();
+        (*subtree)->DestroyChildren();
     }
-    oChildren.DestroyContents();
+    DestroyChildren();
+}
+
+void PTNSubTree::DestroyChildren() {
+    DropIndex();
+    // Each child is cut loose before it is deleted, so that it does not try
+    // to take itself out of this array. A node is never in two slots: AddChild
+    // moves a node it already holds.
+    const int top = oChildren.GetMaxIndex();
+    for (int i = 0; i < top; ++i) {
+        if (auto* child = static_cast<DWXParseTreeNode*>(oChildren[i])) {
+            child->poParent = nullptr;
+            delete child;
+        }
+    }
+    oChildren.Empty();
 }
 
 void PTNSubTree::CopyChildrenFrom(const PTNSubTree& other) {
@@ -156,10 +413,11 @@ void PTNSubTree::CopyChildrenFrom(const PTNSubTree& other) {
             }
             if (IsPlainSubTree(child)) {
                 auto* copy = new PTNSubTree(child->GetName());
-                work.second->AddChild(copy);
+                work.second->AppendChild(copy);
                 pending.emplace_back(static_cast<const PTNSubTree*>(child), copy);
-            } else {
-                work.second->AddChild(child->Copy());
+            } else if (DWXParseTreeNode* copy = child->Copy()) {
+                // A host's class may hand back a node that is already placed.
+                work.second->AddChild(copy);
             }
         }
     }
@@ -169,8 +427,48 @@ void PTNSubTree::AddChild(DWXParseTreeNode* child) {
     if (child == nullptr) {
         return;
     }
+    for (const DWXParseTreeNode* node = this; node != nullptr; node = node->poParent) {
+        if (node == child) {
+            return;  // the subtree itself or an ancestor: a tree cannot hold itself
+        }
+    }
+    if (child->poParent != nullptr) {
+        child->poParent->ForgetChild(child);
+        child->poParent = nullptr;
+    }
+    AppendChild(child);
+}
+
+void PTNSubTree::AppendChild(DWXParseTreeNode* child) {
     oChildren.Add(child);
-    child->SetParent(this);
+    child->poParent = this;
+    if (poIndex != nullptr) {
+        poIndex->Insert(oChildren.GetMaxIndex() - 1);
+    }
+}
+
+void PTNSubTree::ForgetChild(DWXParseTreeNode* child) {
+    NameIndex* index = Index();
+    int slot = index != nullptr ? index->SlotOf(child) : oChildren.GetIndex(child);
+    if (slot < 0) {
+        return;  // a parent recorded with SetParent that does not hold the node
+    }
+    if (index != nullptr) {
+        index->Remove(slot, child->GetName());
+    }
+    oChildren.SetAt(slot, nullptr);
+}
+
+void PTNSubTree::RenameChild(DWXParseTreeNode* child, const char* name) {
+    NameIndex* index = poIndex;
+    int slot = index != nullptr ? index->SlotOf(child) : -1;
+    if (slot >= 0) {
+        index->Remove(slot, child->GetName());
+    }
+    child->ReplaceName(name);
+    if (slot >= 0) {
+        index->Insert(slot);
+    }
 }
 
 const char* PTNSubTree::GetClassName() const {
@@ -192,6 +490,18 @@ void PTNSubTree::SetFrom(DWXParseTreeNode*) {}
 
 DWXParseTreeNode* PTNSubTree::GetChild(const char* name, const char* type) const {
     if (name == nullptr) {
+        return nullptr;
+    }
+    if (const NameIndex* index = Index()) {
+        // The namesakes in child order; the first of the class asked for.
+        const NameIndex::Entry* entry = index->Find(name);
+        for (int32_t at = entry ? entry->first : NameIndex::kEmpty; at != NameIndex::kEmpty;
+             at = index->oNext[static_cast<size_t>(at)]) {
+            auto* child = static_cast<DWXParseTreeNode*>(oChildren[at]);
+            if (type == nullptr || _stricmp(child->GetClassName(), type) == 0) {
+                return child;
+            }
+        }
         return nullptr;
     }
     DWXIter iter(&oChildren);
@@ -243,6 +553,13 @@ char** PTNSubTree::GetChildAsStringList(const char* name) const {
 }
 
 int PTNSubTree::GetNumberOfOccurence(const char* name) const {
+    if (name == nullptr) {
+        return 0;
+    }
+    if (const NameIndex* index = Index()) {
+        const NameIndex::Entry* entry = index->Find(name);
+        return entry != nullptr ? entry->count : 0;
+    }
     int count = 0;
     DWXIter iter(&oChildren);
     for (DWXObject* object = iter.Current(); object != nullptr; object = iter.Next()) {
@@ -267,6 +584,7 @@ void PTNSubTree::SetFrom(PTNSubTree* other, const ExceptionList& exceptions) {
         PTNSubTree* source;
         int next;
     };
+    const ExceptionSet excepted(exceptions.ppcNames, exceptions.nCount);
     std::vector<Level> levels{{this, other, 0}};
     while (!levels.empty()) {
         Level& level = levels.back();
@@ -276,10 +594,11 @@ void PTNSubTree::SetFrom(PTNSubTree* other, const ExceptionList& exceptions) {
         }
         auto* child = static_cast<DWXParseTreeNode*>(level.tree->oChildren[level.next++]);
         if (child == nullptr || child->GetName() == nullptr ||
-            exceptions.IsMember(child->GetName())) {
+            excepted.Contains(child->GetName())) {
             continue;  // an excepted subtree keeps everything below it too
         }
-        // Only the first namesake in `source` counts, whatever its class.
+        // Only the first namesake in `source` counts, whatever its class;
+        // found through the source's index when it is large.
         DWXParseTreeNode* source = level.source->GetChild(child->GetName());
         if (source == nullptr) {
             continue;
