@@ -503,6 +503,15 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     static int PTNValidateFile(FILE* stream, const char* name);
 
   private:
+    // The children array, which grows from 8 slots rather than DWXArray's
+    // 64: most subtrees hold a few leaves, and a large tree holds many of them.
+    class ChildArray : public DWXArray {
+      public:
+        void Append(DWXObject* child);
+        // Hands the slot buffer (null when empty) and its top to the caller,
+        // who frees it with free(); the array is left empty.
+        DWXObject** TakeSlots(int* top);
+    };
     struct NameIndex;
     friend class DWXParseTreeNode;
     friend struct PTNTreeBuilder;
@@ -520,11 +529,10 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     // null for a small subtree.
     NameIndex* Index() const;
     void DropIndex();
-    // Deletes every child (each after its parent pointer is cleared, so none
-    // tries to take itself out) and empties the array.
+    // Deletes every descendant and empties the array.
     void DestroyChildren();
 
-    DWXArray oChildren;
+    ChildArray oChildren;
     // Owned; never shared with a copy. Built lazily by const lookups.
     mutable NameIndex* poIndex;
 };

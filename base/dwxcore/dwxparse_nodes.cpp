@@ -53,8 +53,6 @@ DWXParseTreeNode::~DWXParseTreeNode() {
         poParent->ForgetChild(this);
     }
     FreeName();
-    pcName = nullptr;
-    poParent = nullptr;
 }
 
 void* DWXParseTreeNode::operator new(size_t size) {

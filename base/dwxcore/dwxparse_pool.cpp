@@ -29,7 +29,9 @@
 #include <sanitizer/asan_interface.h>
 #endif
 
-#if defined(__has_include)
+// Debug builds only: the requests cost a few instructions per block even
+// outside valgrind.
+#if !defined(NDEBUG) && defined(__has_include)
 #if __has_include(<valgrind/memcheck.h>)
 #include <valgrind/memcheck.h>
 #define DWXPOOL_VALGRIND 1
@@ -117,23 +119,33 @@ Slab* OpenSlab() {
     return slab;
 }
 
-// The slab this thread carves from. When the thread ends, the slab is let go;
-// a node created later on the thread (from another thread-local destructor)
-// gets a heap block of its own.
+// The slab this thread carves from, in plain thread-local data that is
+// reached without a guard. When the thread ends, the slab is let go; a node
+// created later on the thread (from another thread-local destructor) gets a
+// heap block of its own.
 struct Carver {
-    Slab* poSlab = nullptr;
-    ~Carver();
+    Slab* poSlab;
+    bool bGone;
 };
-thread_local bool tCarverGone = false;
-thread_local Carver tCarver;
+#if defined(__GNUC__) && defined(__ELF__)
+// The library is loaded with the program, so its few bytes of thread-local
+// data can sit in the static block, reached without a call.
+__attribute__((tls_model("initial-exec")))
+#endif
+thread_local Carver tCarver = {nullptr, false};
 
-Carver::~Carver() {
-    if (poSlab != nullptr) {
-        Close(poSlab);
-        poSlab = nullptr;
+// Registered on a thread when it opens its first slab; lets go of the slab
+// when the thread ends.
+struct CarverCloser {
+    ~CarverCloser() {
+        if (tCarver.poSlab != nullptr) {
+            Close(tCarver.poSlab);
+            tCarver.poSlab = nullptr;
+        }
+        tCarver.bGone = true;
     }
-    tCarverGone = true;
-}
+};
+thread_local CarverCloser tCarverCloser;
 
 void* AllocateAlone(size_t size) {
     char* memory = static_cast<char*>(malloc(size + kAlign));
@@ -147,12 +159,12 @@ void* AllocateAlone(size_t size) {
 }  // namespace
 
 void* Allocate(size_t size) noexcept {
-    if (size > kLargest || tCarverGone) {
+    Carver& carver = tCarver;
+    if (size > kLargest || carver.bGone) {
         return AllocateAlone(size);
     }
     // The slab word and the block, rounded so that the next block is aligned too.
     const size_t step = (size + kWord + kAlign - 1) & ~(kAlign - 1);
-    Carver& carver = tCarver;
     Slab* slab = carver.poSlab;
     if (slab == nullptr || static_cast<size_t>(slab->pcEnd - slab->pcNext) < step) {
         Slab* fresh = OpenSlab();
@@ -161,6 +173,8 @@ void* Allocate(size_t size) noexcept {
         }
         if (slab != nullptr) {
             Close(slab);
+        } else {
+            (void)&tCarverCloser;  // the thread's first slab: close it at exit
         }
         carver.poSlab = slab = fresh;
     }

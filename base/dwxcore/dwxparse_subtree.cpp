@@ -33,6 +33,9 @@ uint32_t FoldedHash(const char* name) {
 // a few children is as quick as a hash and costs no memory.
 constexpr int kIndexFrom = 9;
 
+// Where DWXArray's own growth takes over from the children array's.
+constexpr int kFirstCapacity = 64;
+
 // The names of an exception list, hashed once for a whole merge; short
 // lists are searched as they are.
 class ExceptionSet {
@@ -83,7 +86,10 @@ class ExceptionSet {
 // explicit work lists rather than recursion; only these subtrees are walked
 // that way, so a host's subclass keeps its own Copy and destructor.
 bool IsPlainSubTree(const DWXObject* node) {
-    return typeid(*node) == typeid(PTNSubTree);
+    // The library's own type_info object, compared by address: a copy of it
+    // elsewhere could only make a plain subtree look like a host's class,
+    // which then destroys itself by recursion, as a host's class does.
+    return &typeid(*node) == &typeid(PTNSubTree);
 }
 
 }  // namespace
@@ -356,44 +362,53 @@ PTNSubTree& PTNSubTree::operator=(const PTNSubTree& other) {
 }
 
 PTNSubTree::~PTNSubTree() {
-    // Deleting a child subtree deletes its own children, so a deep tree would
-    // recurse once per level. Instead every plain subtree below is listed,
-    // each after its parent, and the list is emptied from its end: a subtree's
-    // children go while it is still in place, and by the time it goes with its
-    // parent it has no children left, so no destructor recurses.
-    std::vector<PTNSubTree*> subtrees;
-    auto listPlainChildren = [&subtrees](const PTNSubTree& parent) {
-        const int top = parent.oChildren.GetMaxIndex();
-        for (int i = 0; i < top; ++i) {
-            DWXObject* child = parent.oChildren[i];
-            if (child != nullptr && IsPlainSubTree(child)) {
-                subtrees.push_back(static_cast<PTNSubTree*>(child));
-            }
-        }
-    };
-    listPlainChildren(*this);
-    for (size_t i = 0; i < subtrees.size(); ++i) {
-        listPlainChildren(*subtrees[i]);
-    }
-    for (auto subtree = subtrees.rbegin(); subtree != subtrees.rend(); ++subtree) {
-        (*subtree)->DestroyChildren();
-    }
     DestroyChildren();
 }
 
 void PTNSubTree::DestroyChildren() {
     DropIndex();
-    // Each child is cut loose before it is deleted, so that it does not try
-    // to take itself out of this array. A node is never in two slots: AddChild
-    // moves a node it already holds.
-    const int top = oChildren.GetMaxIndex();
-    for (int i = 0; i < top; ++i) {
-        if (auto* child = static_cast<DWXParseTreeNode*>(oChildren[i])) {
-            child->poParent = nullptr;
-            delete child;
+    // Deleting a child subtree deletes its own children, so a deep tree would
+    // recurse once per level. Instead a plain subtree's children array is
+    // taken from it before it is deleted and walked next, from a stack of
+    // taken arrays as deep as the tree: every node is visited once and no
+    // destructor recurses. Each child is cut loose from its parent before it
+    // is deleted, so that it does not try to take itself out of an array that
+    // is going anyway. A node is never in two slots, as AddChild moves a node
+    // it already holds.
+    struct Taken {
+        DWXObject** items;
+        int top;
+        int next;
+    };
+    Taken first{nullptr, 0, 0};
+    first.items = oChildren.TakeSlots(&first.top);
+    if (first.items == nullptr) {
+        return;
+    }
+    std::vector<Taken> stack{first};
+    while (!stack.empty()) {
+        Taken& taken = stack.back();
+        if (taken.next == taken.top) {
+            free(taken.items);
+            stack.pop_back();
+            continue;
+        }
+        auto* child = static_cast<DWXParseTreeNode*>(taken.items[taken.next++]);
+        if (child == nullptr) {
+            continue;
+        }
+        child->poParent = nullptr;
+        Taken below{nullptr, 0, 0};
+        if (IsPlainSubTree(child)) {
+            auto* subtree = static_cast<PTNSubTree*>(child);
+            subtree->DropIndex();
+            below.items = subtree->oChildren.TakeSlots(&below.top);
+        }
+        delete child;
+        if (below.items != nullptr) {
+            stack.push_back(below);  // `taken` is not used after this
         }
     }
-    oChildren.Empty();
 }
 
 void PTNSubTree::CopyChildrenFrom(const PTNSubTree& other) {
@@ -439,8 +454,31 @@ void PTNSubTree::AddChild(DWXParseTreeNode* child) {
     AppendChild(child);
 }
 
+void PTNSubTree::ChildArray::Append(DWXObject* child) {
+    if (nTop == nCapacity && nCapacity < kFirstCapacity) {
+        // DWXArray::Add grows an array that is full, from 64 slots; this
+        // gives it its first few. Beyond them Add doubles as usual.
+        const int capacity = nCapacity == 0 ? 8 : kFirstCapacity;
+        ppoItems = static_cast<DWXObject**>(
+            HRealloc(ppoItems, static_cast<size_t>(capacity) * sizeof(DWXObject*)));
+        for (int i = nCapacity; i < capacity; ++i) {
+            ppoItems[i] = nullptr;
+        }
+        nCapacity = capacity;
+    }
+    Add(child);
+}
+
+DWXObject** PTNSubTree::ChildArray::TakeSlots(int* top) {
+    DWXObject** items = ppoItems;
+    *top = nTop;
+    ppoItems = nullptr;
+    nCount = nCapacity = nTop = 0;
+    return items;
+}
+
 void PTNSubTree::AppendChild(DWXParseTreeNode* child) {
-    oChildren.Add(child);
+    oChildren.Append(child);
     child->poParent = this;
     if (poIndex != nullptr) {
         poIndex->Insert(oChildren.GetMaxIndex() - 1);
