@@ -69,8 +69,9 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
 
   private:
     // A name this short (its terminator included) is kept in the node
-    // itself, which saves most nodes a heap block of their own; pcName points
-    // at whichever storage holds the name (null for a null name).
+    // itself, which saves most nodes a block of their own; a longer one comes
+    // from the node pool. pcName points at whichever storage holds the name
+    // (null for a null name).
     static constexpr size_t kShortName = 8;
     void InitName(const char* name);
     void FreeName();

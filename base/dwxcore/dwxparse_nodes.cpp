@@ -21,6 +21,16 @@ const char* TextOrEmpty(const char* text) {
     return text != nullptr ? text : "";
 }
 
+// A copy of a long name from the node pool, next to the node when the node
+// was just made, so that reading a node's name seldom needs another cache line.
+char* PooledName(const char* name, size_t size) {
+    void* copy = dwxparse_pool::Allocate(size);
+    if (copy == nullptr) {
+        throw std::bad_alloc();
+    }
+    return static_cast<char*>(memcpy(copy, name, size));
+}
+
 // A heap copy of the text that a Put function wrote into `buffer`.
 char* HeapText(char* buffer, char* end) {
     *end = '\0';
@@ -85,13 +95,13 @@ void DWXParseTreeNode::InitName(const char* name) {
         memcpy(acShortName, name, size);
         pcName = acShortName;
     } else {
-        pcName = HString(name);
+        pcName = PooledName(name, size);
     }
 }
 
 void DWXParseTreeNode::FreeName() {
-    if (pcName != acShortName) {
-        free(pcName);
+    if (pcName != nullptr && pcName != acShortName) {
+        dwxparse_pool::Release(pcName, strlen(pcName) + 1);
     }
 }
 
@@ -112,7 +122,7 @@ void DWXParseTreeNode::ReplaceName(const char* name) {
         InitName(copy);
         return;
     }
-    char* copy = HString(name);
+    char* copy = name != nullptr ? PooledName(name, strlen(name) + 1) : nullptr;
     FreeName();
     pcName = copy;
 }

@@ -7,6 +7,7 @@
 
 #include <stdint.h>
 #include <stdlib.h>
+#include <string.h>
 
 #include <typeinfo>
 #include <utility>
@@ -19,14 +20,65 @@ bool NameMatches(const DWXParseTreeNode* node, const char* name) {
     return name != nullptr && node->GetName() != nullptr && _stricmp(node->GetName(), name) == 0;
 }
 
-// FNV-1a over the name with ASCII letters folded, so that two names that
-// _stricmp calls equal always hash alike.
-uint32_t FoldedHash(const char* name) {
-    uint32_t hash = 2166136261u;
-    for (const unsigned char* p = reinterpret_cast<const unsigned char*>(name); *p != '\0'; ++p) {
-        hash = (hash ^ AsciiLower(*p)) * 16777619u;
+// Eight bytes of a name with the ASCII letters A-Z folded to a-z, all
+// eight at once; bytes from 0x80 up are left alone, as AsciiLower leaves them.
+uint64_t FoldWord(uint64_t word) {
+    constexpr uint64_t kOnes = 0x0101010101010101ull;
+    constexpr uint64_t kHigh = 0x8080808080808080ull;
+    const uint64_t low = word & ~kHigh;
+    const uint64_t atLeastA = low + (0x80 - 'A') * kOnes;       // high bit: byte >= 'A'
+    const uint64_t aboveZ = low + (0x80 - 'Z' - 1) * kOnes;     // high bit: byte > 'Z'
+    const uint64_t upper = atLeastA & ~aboveZ & ~word & kHigh;  // and byte < 0x80
+    return word | (upper >> 2);                                 // 0x80 >> 2 is 'a' - 'A'
+}
+
+// A hash of the name with ASCII letters folded, so that two names that
+// _stricmp calls equal always hash alike; a word at a time. The name's
+// length goes to *length.
+uint32_t FoldedHash(const char* name, size_t* length) {
+    const size_t size = strlen(name);
+    *length = size;
+    uint64_t hash = 0x9e3779b97f4a7c15ull ^ size;
+    size_t i = 0;
+    for (; i + 8 <= size; i += 8) {
+        uint64_t word;
+        memcpy(&word, name + i, 8);
+        hash = (hash ^ FoldWord(word)) * 0xff51afd7ed558ccdull;
+        hash ^= hash >> 29;
     }
-    return hash;
+    uint64_t tail = 0;
+    for (size_t j = 0; i + j < size; ++j) {  // [0, 7] bytes
+        tail |= static_cast<uint64_t>(static_cast<unsigned char>(name[i + j])) << (8 * j);
+    }
+    hash = (hash ^ FoldWord(tail)) * 0xc4ceb9fe1a85ec53ull;
+    return static_cast<uint32_t>(hash ^ (hash >> 32));
+}
+
+uint32_t FoldedHash(const char* name) {
+    size_t length;
+    return FoldedHash(name, &length);
+}
+
+// Equal ignoring ASCII case, as _stricmp decides, for two names of
+// `length` bytes (folding never changes a length, so names of different
+// lengths never match). Names are mostly looked up as they are written, so
+// the exact test comes first, a word at a time.
+bool SameName(const char* a, const char* b, size_t length) {
+    size_t i = 0;
+    for (; i + 8 <= length; i += 8) {
+        uint64_t x, y;
+        memcpy(&x, a + i, 8);
+        memcpy(&y, b + i, 8);
+        if (x != y) {
+            return _stricmp(a, b) == 0;
+        }
+    }
+    for (; i < length; ++i) {
+        if (a[i] != b[i]) {
+            return _stricmp(a, b) == 0;
+        }
+    }
+    return true;
 }
 
 // Subtrees with no more children than this are searched by a walk; a walk of
@@ -173,28 +225,38 @@ struct PTNSubTree::NameIndex {
         int32_t first;  // slot, kEmpty or kGone
         int32_t last;
         int32_t count;
+        uint32_t length;         // of the name
+        DWXParseTreeNode* node;  // the child in `first`, so a lookup need not read the array
     };
 
     explicit NameIndex(const DWXArray& children) : oChildren(children) { Rebuild(); }
 
-    const char* NameAt(int32_t slot) const {
-        return static_cast<DWXParseTreeNode*>(oChildren[slot])->GetName();
+    DWXParseTreeNode* NodeAt(int32_t slot) const {
+        return static_cast<DWXParseTreeNode*>(oChildren[slot]);
     }
 
     // The entry of that name, or null.
     const Entry* Find(const char* name) const {
-        return const_cast<NameIndex*>(this)->FindEntry(name, FoldedHash(name));
+        size_t length;
+        const uint32_t hash = FoldedHash(name, &length);
+        return const_cast<NameIndex*>(this)->FindEntry(name, hash, length);
     }
 
-    Entry* FindEntry(const char* name, uint32_t hash) {
+    Entry* FindEntry(const char* name) {
+        size_t length;
+        const uint32_t hash = FoldedHash(name, &length);
+        return FindEntry(name, hash, length);
+    }
+
+    Entry* FindEntry(const char* name, uint32_t hash, size_t length) {
         const size_t mask = oEntries.size() - 1;
         for (size_t i = hash & mask;; i = (i + 1) & mask) {
             Entry& entry = oEntries[i];
             if (entry.first == kEmpty) {
                 return nullptr;
             }
-            if (entry.first >= 0 && entry.hash == hash &&
-                _stricmp(NameAt(entry.first), name) == 0) {
+            if (entry.first >= 0 && entry.hash == hash && entry.length == length &&
+                SameName(entry.node->GetName(), name, length)) {
                 return &entry;
             }
         }
@@ -203,15 +265,17 @@ struct PTNSubTree::NameIndex {
     // Records the child in `slot` under its name, in slot order among its
     // namesakes: O(1) for the last slot, O(namesakes) otherwise.
     void Insert(int32_t slot) {
-        const char* name = NameAt(slot);
+        DWXParseTreeNode* child = NodeAt(slot);
+        const char* name = child->GetName();
         if (name == nullptr) {
             return;  // a null name is never found
         }
         if (static_cast<size_t>(slot) >= oNext.size()) {
             oNext.resize(static_cast<size_t>(slot) + 1 + oNext.size() / 2, kEmpty);
         }
-        const uint32_t hash = FoldedHash(name);
-        if (Entry* entry = FindEntry(name, hash)) {
+        size_t length;
+        const uint32_t hash = FoldedHash(name, &length);
+        if (Entry* entry = FindEntry(name, hash, length)) {
             ++entry->count;
             if (slot > entry->last) {
                 oNext[static_cast<size_t>(entry->last)] = slot;
@@ -220,6 +284,7 @@ struct PTNSubTree::NameIndex {
             } else if (slot < entry->first) {
                 oNext[static_cast<size_t>(slot)] = entry->first;
                 entry->first = slot;
+                entry->node = child;
             } else {
                 int32_t at = entry->first;
                 while (oNext[static_cast<size_t>(at)] < slot) {
@@ -242,7 +307,7 @@ struct PTNSubTree::NameIndex {
         if (oEntries[i].first == kEmpty) {
             ++nUsed;
         }
-        oEntries[i] = {hash, slot, slot, 1};
+        oEntries[i] = {hash, slot, slot, 1, static_cast<uint32_t>(length), child};
         oNext[static_cast<size_t>(slot)] = kEmpty;
     }
 
@@ -252,7 +317,7 @@ struct PTNSubTree::NameIndex {
         if (name == nullptr) {
             return false;
         }
-        Entry* entry = FindEntry(name, FoldedHash(name));
+        Entry* entry = FindEntry(name);
         if (entry == nullptr) {
             return false;
         }
@@ -268,6 +333,7 @@ struct PTNSubTree::NameIndex {
         const int32_t after = oNext[static_cast<size_t>(slot)];
         if (previous == kEmpty) {
             entry->first = after;
+            entry->node = after >= 0 ? NodeAt(after) : nullptr;
         } else {
             oNext[static_cast<size_t>(previous)] = after;
         }
@@ -303,7 +369,7 @@ struct PTNSubTree::NameIndex {
         while (size < 2 * static_cast<size_t>(top) + 2) {
             size *= 2;
         }
-        oEntries.assign(size, Entry{0, kEmpty, kEmpty, 0});
+        oEntries.assign(size, Entry{0, kEmpty, kEmpty, 0, 0, nullptr});
         oNext.assign(static_cast<size_t>(top) + 1, kEmpty);
         nUsed = 0;
         for (int32_t slot = 0; slot < top; ++slot) {
@@ -533,6 +599,9 @@ DWXParseTreeNode* PTNSubTree::GetChild(const char* name, const char* type) const
     if (const NameIndex* index = Index()) {
         // The namesakes in child order; the first of the class asked for.
         const NameIndex::Entry* entry = index->Find(name);
+        if (type == nullptr) {
+            return entry != nullptr ? entry->node : nullptr;
+        }
         for (int32_t at = entry ? entry->first : NameIndex::kEmpty; at != NameIndex::kEmpty;
              at = index->oNext[static_cast<size_t>(at)]) {
             auto* child = static_cast<DWXParseTreeNode*>(oChildren[at]);
