@@ -37,7 +37,7 @@ std::vector<DWXParseTreeNode*> Children(const PTNSubTree& tree) {
 // The answers of a walk of the children, in order.
 DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char* type) {
     for (DWXParseTreeNode* child : Children(tree)) {
-        if (_stricmp(child->GetName(), name) == 0 &&
+        if (child->GetName() && _stricmp(child->GetName(), name) == 0 &&
             (!type || _stricmp(child->GetClassName(), type) == 0)) {
             return child;
         }
@@ -48,7 +48,7 @@ DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char*
 int WalkCount(const PTNSubTree& tree, const char* name) {
     int count = 0;
     for (DWXParseTreeNode* child : Children(tree)) {
-        count += _stricmp(child->GetName(), name) == 0;
+        count += child->GetName() && _stricmp(child->GetName(), name) == 0;
     }
     return count;
 }
@@ -101,7 +101,7 @@ TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
                 case 1:
                 case 2:
                     if (some) {
-                        some->SetName(kNames[random() % 8]);
+                        some->SetName(random() % 9 ? kNames[random() % 8] : nullptr);
                     }
                     break;
                 case 3:

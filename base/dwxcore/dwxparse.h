@@ -521,6 +521,8 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     // Appends a node that has no parent and is no ancestor (the reader's and
     // the copy's new nodes).
     void AppendChild(DWXParseTreeNode* child);
+    // The slot of `child`, or -1 when it is not one of the children.
+    int SlotOf(const DWXParseTreeNode* child) const;
     // Takes `child` out of the children without deleting it; nothing when it
     // is not one of them.
     void ForgetChild(DWXParseTreeNode* child);

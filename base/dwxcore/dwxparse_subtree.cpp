@@ -497,8 +497,13 @@ void PTNSubTree::CopyChildrenFrom(const PTNSubTree& other) {
                 work.second->AppendChild(copy);
                 pending.emplace_back(static_cast<const PTNSubTree*>(child), copy);
             } else if (DWXParseTreeNode* copy = child->Copy()) {
-                // A host's class may hand back a node that is already placed.
-                work.second->AddChild(copy);
+                // A host's class may hand back a node that is already placed;
+                // a new one needs none of AddChild's checks.
+                if (copy->poParent == nullptr) {
+                    work.second->AppendChild(copy);
+                } else {
+                    work.second->AddChild(copy);
+                }
             }
         }
     }
@@ -551,27 +556,32 @@ void PTNSubTree::AppendChild(DWXParseTreeNode* child) {
     }
 }
 
+int PTNSubTree::SlotOf(const DWXParseTreeNode* child) const {
+    const int slot = poIndex != nullptr ? poIndex->SlotOf(child) : -1;
+    // Nameless children are not indexed; they are found by a walk.
+    return slot >= 0 ? slot : oChildren.GetIndex(child);
+}
+
 void PTNSubTree::ForgetChild(DWXParseTreeNode* child) {
-    NameIndex* index = Index();
-    int slot = index != nullptr ? index->SlotOf(child) : oChildren.GetIndex(child);
+    Index();  // so that taking many children out of a large subtree is not quadratic
+    const int slot = SlotOf(child);
     if (slot < 0) {
         return;  // a parent recorded with SetParent that does not hold the node
     }
-    if (index != nullptr) {
-        index->Remove(slot, child->GetName());
+    if (poIndex != nullptr) {
+        poIndex->Remove(slot, child->GetName());
     }
     oChildren.SetAt(slot, nullptr);
 }
 
 void PTNSubTree::RenameChild(DWXParseTreeNode* child, const char* name) {
-    NameIndex* index = poIndex;
-    int slot = index != nullptr ? index->SlotOf(child) : -1;
+    const int slot = poIndex != nullptr ? SlotOf(child) : -1;
     if (slot >= 0) {
-        index->Remove(slot, child->GetName());
+        poIndex->Remove(slot, child->GetName());
     }
     child->ReplaceName(name);
     if (slot >= 0) {
-        index->Insert(slot);
+        poIndex->Insert(slot);
     }
 }
 
