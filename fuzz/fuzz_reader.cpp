@@ -109,6 +109,14 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     char* written = tree.GetAsString();
     FUZZ_CHECK(written != nullptr);
 
+    // A read with a log throws nothing and builds the same tree.
+    PTNSubTree logged("root");
+    PTNReadLog log;
+    logged.BuildFromString(text.c_str(), &log);
+    char* loggedText = logged.GetAsString();
+    FUZZ_CHECK(strcmp(written, loggedText) == 0);
+    free(loggedText);
+
     PTNSubTree* copy = tree.DeepCopy();
     char* copied = copy->GetAsString();
     FUZZ_CHECK(found.rawBase64 || strcmp(written, copied) == 0);

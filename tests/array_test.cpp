@@ -122,13 +122,17 @@ TEST_F(ArrayTest, ReorderingClosesHoles) {
     array.Reverse();
     EXPECT_EQ(array.Slots(), (Members{&c, &b, &a}));
     EXPECT_EQ(array.Capacity(), 64);
-    for (bool standard : {false, true}) {
-        Array sorted;
-        sorted.SetAt(0, &c);
-        sorted.SetAt(2, &a);
-        sorted.SetAt(3, &b);
-        standard ? sorted.StandartSort(ByValue) : sorted.Sort(ByValue);
-        EXPECT_EQ(sorted.Slots(), (Members{&a, &b, &c}));
+    using Compare = int (*)(const void*, const void*);
+    for (Compare compare : {Compare(ByValue), Compare(nullptr)}) {
+        for (bool standard : {false, true}) {
+            Array sorted;
+            sorted.SetAt(0, &c);
+            sorted.SetAt(2, &a);
+            sorted.SetAt(3, &b);
+            standard ? sorted.StandartSort(compare) : sorted.Sort(compare);
+            // Without a comparator the array is still packed.
+            EXPECT_EQ(sorted.Slots(), compare ? (Members{&a, &b, &c}) : (Members{&c, &a, &b}));
+        }
     }
 }
 

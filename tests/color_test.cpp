@@ -61,6 +61,7 @@ TEST(ColorTest, BytesAlphaEqualityAndDump) {
     EXPECT_EQ(assigned, color);
 
     EXPECT_EQ(Captured([&](FILE* f) { color.Dump(f); }), "<DWXColor:7,8,9>\n");
+    color.Dump(nullptr);  // writes nothing, as every other Dump
     EXPECT_STREQ(color.GetClassName(), "DWXColor");
 }
 

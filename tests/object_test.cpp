@@ -1,11 +1,13 @@
 #include "container_test_util.h"
 #include "counting_object.h"
 
+#include <dwxcore/dwxcmdline.h>
 #include <dwxcore/dwxobject.h>
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <type_traits>
 #include <vector>
 
 DEFINE_COUNTING_OBJECT_COUNTERS();
@@ -91,6 +93,37 @@ TEST(ObjectTest, IteratorProtocol) {
     EXPECT_EQ(iter.Next(), nullptr);
 }
 
+// Hosts write `DWXIter iter = &array;` and pass containers where arrays are expected.
+static_assert(std::is_convertible_v<DWXArray*, DWXIter> &&
+                  std::is_convertible_v<DWXLinkedList*, DWXArray> &&
+                  std::is_convertible_v<DWXBag*, DWXPackedArray> &&
+                  std::is_convertible_v<DWXArray*, DWXBag> &&
+                  std::is_convertible_v<const char*, DWXCmdLine>,
+              "constructors from a container or a command string are implicit");
+
+TEST(ObjectTest, RetargetingAnIteratorStartsOnTheNewContainer) {
+    CountingObject a, b, c;
+    DWXArray array;
+    DWXBag bag;
+    DWXLinkedList list;
+    std::vector<DWXContainer*> all = {&array, &bag, &list};
+    for (DWXContainer* container : all) {
+        AddAll(*container, {&a, &b, &c});
+    }
+    for (DWXContainer* from : all) {
+        for (DWXContainer* to : all) {
+            DWXIter iter = from;
+            iter.Next();
+            iter.SetTarget(to);
+            EXPECT_EQ(iter.Next(), to == from ? &c : &a)
+                << from->GetClassName() << " to " << to->GetClassName();
+            iter.SetTarget(nullptr);
+            iter.SetTarget(to);
+            EXPECT_EQ(iter.Next(), &a);
+        }
+    }
+}
+
 TEST(ObjectTest, ValidateAsksValidatableMembersUntilOneFails) {
     DWXArray array;
     EXPECT_EQ(array.Validate(), 1);
@@ -137,6 +170,71 @@ TEST(ObjectTest, DestroyContentsDeletesEachMemberOnce) {
     }
 }
 
+// A member whose destructor changes the container it sits in, as members that
+// own siblings do: it removes and deletes a sibling, removes itself, or adds a
+// new member. Destructions are logged by id.
+class Meddler : public CountingObject {
+  public:
+    Meddler(int id, DWXContainer* in) : CountingObject(id), poIn(in) {}
+    ~Meddler() override {
+        log.push_back(nValue);
+        if (poSibling && poIn->Remove(poSibling)) {
+            delete poSibling;
+        }
+        if (bRemoveSelf) {
+            poIn->Remove(this);
+        }
+        if (bSpawn) {
+            poIn->Add(new Meddler(99, poIn));
+        }
+    }
+    DWXContainer* poIn;
+    Meddler* poSibling = nullptr;
+    bool bRemoveSelf = false;
+    bool bSpawn = false;
+    static std::vector<int> log;
+};
+std::vector<int> Meddler::log;
+
+TEST(ObjectTest, DestroyContentsSurvivesDestructorsThatChangeTheContainer) {
+    DWXArray array;
+    DWXPackedArray packed;
+    DWXBag bag;
+    DWXLinkedList list;
+    HostContainer host;
+    const std::vector<int> inOrder = {0, 1, 2, 3, 4, 5, 99};
+    struct Case {
+        DWXContainer* container;
+        std::vector<int> log;
+    } cases[] = {
+        {&array, inOrder},
+        // Removing sibling 1 moves the last member, 5, into its slot, ahead of the walk.
+        {&packed, {0, 1, 5, 2, 3, 4, 99}},
+        {&bag, {0, 1, 5, 2, 3, 4, 99}},
+        {&list, inOrder},
+        {&host, inOrder},
+    };
+    for (const Case& c : cases) {
+        CountingObject::Reset();
+        Meddler::log.clear();
+        std::vector<Meddler*> m;
+        for (int i = 0; i < 6; ++i) {
+            m.push_back(new Meddler(i, c.container));
+            c.container->Add(m.back());
+        }
+        c.container->Add(m[4]);  // held twice, and removes itself
+        m[0]->poSibling = m[1];  // owner before its sibling
+        m[3]->poSibling = m[2];  // owner after its sibling
+        m[4]->bRemoveSelf = true;
+        m[5]->bSpawn = true;
+        c.container->DestroyContents();
+        EXPECT_EQ(Meddler::log, c.log) << c.container->GetClassName();
+        EXPECT_EQ(CountingObject::constructed, 7);
+        EXPECT_EQ(CountingObject::Alive(), 0) << c.container->GetClassName();
+        EXPECT_EQ(c.container->GetCount(), 0);
+    }
+}
+
 TEST(ObjectTest, DefaultEmptyStopsWhenRemoveRefuses) {
     CountingObject a, b;
     HostContainer host;
@@ -147,6 +245,32 @@ TEST(ObjectTest, DefaultEmptyStopsWhenRemoveRefuses) {
     host.refuseRemove = true;
     host.Empty();  // must not spin for ever
     EXPECT_EQ(host.GetCount(), 1);
+}
+
+TEST(ObjectTest, RangeForVisitsWhatDWXIterVisits) {
+    CountingObject a, b, c, d;
+    DWXArray array, empty;
+    DWXPackedArray packed;
+    DWXBag bag;
+    DWXLinkedList list;
+    HostContainer host;
+    for (DWXContainer* container :
+         std::vector<DWXContainer*>{&array, &packed, &bag, &list, &host}) {
+        AddAll(*container, {&a, &b, &c, &d});
+        container->Remove(&b);  // a hole in the array, a move in the others
+    }
+    AddAll(bag, {nullptr, &b});  // a stored null ends a walk
+    list.Insert(nullptr, list.Find(&c));
+    for (const DWXContainer* container :
+         std::vector<const DWXContainer*>{&array, &packed, &bag, &list, &host, &empty}) {
+        Members visited;
+        for (DWXObject* o : *container) {
+            visited.push_back(o);
+        }
+        EXPECT_EQ(visited, Walk(*container)) << container->GetClassName();
+        EXPECT_EQ(container->begin() == container->end(), visited.empty());
+    }
+    EXPECT_EQ(std::count(array.begin(), array.end(), &c), 1);
 }
 
 }  // namespace

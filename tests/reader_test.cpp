@@ -10,10 +10,14 @@
 
 #include <gtest/gtest.h>
 
+#include <errno.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
+#include <algorithm>
 #include <functional>
 #include <memory>
 #include <sstream>
@@ -358,6 +362,105 @@ TEST_F(ReaderTest, IncludeCycleAndDepthLimit) {
         0u);
 }
 
+// The null device, under any name, switches an include off silently; every
+// other kind of file that is not a regular one is refused as missing, and a
+// FIFO without a writer is refused at once rather than waited on.
+TEST_F(ReaderTest, NullDeviceIsAnEmptyIncludeOtherSpecialFilesAreMissing) {
+    std::string fifo = oDir.Path("pipe");
+    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    std::string nullLink = oDir.Path("off.cfg");
+    ASSERT_EQ(symlink("/dev/null", nullLink.c_str()), 0);
+    struct Row {
+        std::string target;
+        bool missing;
+    } rows[] = {
+        {"/dev/null", false}, {nullLink, false},   {fifo, true},
+        {"/dev/zero", true},  {oDir.Root(), true},
+    };
+    for (const Row& row : rows) {
+        for (const char* directive : {"@include", "@try_include"}) {
+            gReports.clear();
+            auto tree = Read("(a Integer 1)\n(" + std::string(directive) + " " + row.target +
+                             ")\n(b Integer 2)\n");
+            EXPECT_EQ(Shape(tree.get()), "a b") << row.target;
+            bool reported = row.missing && directive[1] == 'i';
+            ASSERT_EQ(gReports.size(), reported ? 1u : 0u) << directive << " " << row.target;
+            if (reported) {
+                EXPECT_EQ(gReports[0].find("3/2 Unable to locate file '" + row.target + "'"), 0u);
+            }
+        }
+    }
+}
+
+// A stream that hands out `text` up to byte `failAt`, then fails with EIO. It
+// cannot seek: rewinding it fails harmlessly, since it is read from its start.
+struct FailingSource {
+    std::string text;
+    size_t failAt;
+    size_t position = 0;
+};
+
+FILE* OpenFailing(FailingSource& source) {
+    cookie_io_functions_t io = {};
+    io.read = [](void* cookie, char* buffer, size_t size) -> ssize_t {
+        auto* source = static_cast<FailingSource*>(cookie);
+        if (source->position >= source->failAt) {
+            errno = EIO;
+            return -1;
+        }
+        size_t count = std::min(size, source->failAt - source->position);
+        memcpy(buffer, source->text.data() + source->position, count);
+        source->position += count;
+        return static_cast<ssize_t>(count);
+    };
+    return fopencookie(&source, "r", io);
+}
+
+// A read error is reported with the file, the line reached and the system's
+// reason; the complete lines before it stay read, the line it cut short is
+// dropped rather than read with a truncated value.
+TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
+    auto report = [](const std::string& file, int line) {
+        return "3/2 Read error in file '" + file + "'\nafter line " + std::to_string(line) + ": " +
+               strerror(EIO) + ".\nThe lines before it were kept.\n";
+    };
+    std::string text = "(a Integer 1)\n(s SubTree\n  (b Integer 2)\n  (c Integer 345)\n)\n";
+    FailingSource source{text, text.find("5)")};
+    FILE* stream = OpenFailing(source);
+    ASSERT_NE(stream, nullptr);
+    PTNSubTree tree("root");
+    tree.BuildFromFile(stream);
+    fclose(stream);
+    EXPECT_EQ(Shape(&tree, true), "a:PTNInteger=1 s{b:PTNInteger=2}");
+    EXPECT_EQ(gReports, Texts{report("Memory", 3)});
+
+    // The kernel refuses to read the first page of a process's memory: a
+    // real error on a file that passes every check. Through an include, and
+    // as the file the reading starts from.
+    gReports.clear();
+    auto included = Read("(a Integer 1)\n(@include /proc/self/mem)\n(b Integer 2)\n");
+    EXPECT_EQ(Shape(included.get()), "a b");
+    EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
+    gReports.clear();
+    PTNSubTree whole("root");
+    ReadFile(whole, "/proc/self/mem");
+    EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
+
+    // With a read log the report goes there, with its place, and nowhere else.
+    gReports.clear();
+    FailingSource again{text, text.find("5)")};
+    stream = OpenFailing(again);
+    PTNSubTree logged("root");
+    PTNReadLog log;
+    logged.BuildFromFile(stream, &log);
+    fclose(stream);
+    EXPECT_TRUE(gReports.empty());
+    ASSERT_EQ(log.Reports().size(), 1u);
+    EXPECT_EQ(log.Reports()[0].code, 3);
+    EXPECT_EQ(log.Reports()[0].file, "Memory");
+    EXPECT_EQ(log.Reports()[0].line, 3);
+}
+
 TEST_F(ReaderTest, IncludeTrace) {
     std::string directive = "@Include " + oDir.Write("inc.cfg", "(x Integer 9)\n");
     std::string text = "(" + directive + ")\n";
@@ -419,6 +522,141 @@ TEST_F(ReaderTest, WriteThenReadEveryClass) {
         R"(edl:PTNDoubleList= b64:PTNBase64=AP9hCg== zero:PTNChar=) blank:PTNChar=) )"
         R"(inner{deep:PTNInteger=7 empty{}}})");
     ASSERT_EQ(gReports.size(), 1u);  // the tab line
+}
+
+// Reads with a log ----------------------------------------------------------
+
+// Each entry as "code/severity file:line".
+Texts Entries(const std::vector<PTNReadReport>& reports) {
+    Texts texts;
+    for (const PTNReadReport& r : reports) {
+        texts.push_back(std::to_string(r.code) + "/" + std::to_string(r.severity) + " " + r.file +
+                        ":" + std::to_string(r.line));
+    }
+    return texts;
+}
+
+PTNReadLog ReadLogged(PTNSubTree& tree, const std::string& path) {
+    PTNReadLog log;
+    FILE* stream = DKOpen(path.c_str(), 4, "r");
+    EXPECT_NO_THROW(tree.BuildFromFile(stream, &log));
+    DKClose(stream);
+    return log;
+}
+
+// A node's line and the chain of files that reached it, "line file@includedAtLine ...".
+std::string Where(const DWXParseTreeNode* node) {
+    std::string text = std::to_string(node->GetSourceLine());
+    for (const PTNSourceFile* file = node->GetSourceFile(); file; file = file->includedBy) {
+        const char* slash = strrchr(file->name, '/');
+        text += std::string(" ") + (slash ? slash + 1 : file->name) + "@" +
+                std::to_string(file->includedAtLine);
+    }
+    return text;
+}
+
+TEST_F(ReaderTest, LogTakesReportsAndWarningsWithTheirLines) {
+    struct Row {
+        const char* text;
+        Texts reports, warnings;
+    } rows[] = {
+        {"(t SubTree\n(w Integer -2147483648)\n(b Bool yes)\n(s String \"x y\" )\n"
+         "(d Double -2.5e3)\n(e Double .5)\n(k Integer +7)\n)\n",
+         {},
+         {}},
+        {"(a Integer 1)\n\n(corrupt)\n(b Integer 2)\n", {"-1/1 Memory:3"}, {}},
+        {"! c\n(port Integr 8080)\n(f Float 1.5)\n", {}, {"101/3 Memory:2", "101/3 Memory:3"}},
+        {"(a Integer 1)\n)\n(b Integer 2)\n", {}, {"102/3 Memory:2"}},
+        // The blank makes config the keyword; the closing line then ends the read.
+        {"( config SubTree\n(x Integer 1)\n)\n(y Integer 2)\n",
+         {},
+         {"103/3 Memory:1", "102/3 Memory:3"}},
+        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n",
+         {},
+         {"104/3 Memory:1", "104/3 Memory:2", "104/3 Memory:3"}},
+        {"(d Double 1.5x)\n(f Double abc)\n", {}, {"105/3 Memory:1", "105/3 Memory:2"}},
+        {"#\n\n(s String \"a\" \"b\")\n", {}, {"106/3 Memory:3"}},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.text);
+        PTNSubTree logged("root"), plain("root");
+        PTNReadLog log;
+        EXPECT_NO_THROW(logged.BuildFromString(row.text, &log));
+        EXPECT_TRUE(gReports.empty());
+        EXPECT_EQ(Entries(log.Reports()), row.reports);
+        EXPECT_EQ(Entries(log.Warnings()), row.warnings);
+        EXPECT_EQ(log.Ok(), row.reports.empty());
+        // Without a log: the handler and the exception as always, no warnings, the same tree.
+        try {
+            plain.BuildFromString(row.text, nullptr);
+        } catch (const tzn::Exception&) {
+        }
+        EXPECT_EQ(gReports.size(), row.reports.size());
+        EXPECT_EQ(Shape(&logged, true), Shape(&plain, true));
+        gReports.clear();
+    }
+}
+
+TEST_F(ReaderTest, LogNamesIncludedFilesAndTheirOwnLines) {
+    std::string inc =
+        oDir.Write("inc.cfg", "! 1\n(x Integr 5)\n(s SubTree\n(bad)\n)\n(lost Integer 1)\n");
+    std::string main = oDir.Write("main.cfg", "(a Integer 1)\n(@include " + inc + ")\n(@include " +
+                                                  oDir.Path("none.cfg") + ")\n(@include " + inc +
+                                                  ")\n(b Integer 2)\n");
+    PTNSubTree tree("root");
+    PTNReadLog log = ReadLogged(tree, main);
+    EXPECT_EQ(Shape(&tree), "a s{} s{} b");
+    EXPECT_EQ(Entries(log.Reports()),
+              (Texts{"-1/1 " + inc + ":4", "3/2 " + main + ":3", "-1/1 " + inc + ":4"}));
+    EXPECT_EQ(Entries(log.Warnings()), (Texts{"101/3 " + inc + ":2", "101/3 " + inc + ":2"}));
+    EXPECT_EQ(log.Files(), (Texts{main, inc}));  // once each, the starting file first
+    EXPECT_TRUE(gReports.empty());
+}
+
+TEST_F(ReaderTest, SourcesThroughIncludesCopiesMergesAndRereads) {
+    std::string leaf = oDir.Write("leaf.cfg", "! leaf\n(deep Integer 3)\n");
+    std::string mid = oDir.Write("mid.cfg", "(@include " + leaf + ")\n(mid Integer 2)\n");
+    std::string main =
+        oDir.Write("main.cfg", "(s SubTree\n(top Integer 1)\n(@include " + mid + ")\n)\n");
+    PTNSubTree tree("root"), again("root");
+    ReadFile(tree, main);
+    ReadFile(again, main);
+    DWXParseTreeNode* deep = tree.Find("s/deep");
+    EXPECT_EQ(Where(tree.Find("s")) + ", " + Where(tree.Find("s/mid")) + ", " + Where(deep),
+              "1 main.cfg@0, 2 mid.cfg@3 main.cfg@0, 2 leaf.cfg@1 mid.cfg@3 main.cfg@0");
+    EXPECT_EQ(tree.Find("s/mid")->GetSourceFile()->name, mid);
+    // Rereads and copies point to the very same records; merges keep the target's.
+    for (const char* path : {"s", "s/top", "s/mid", "s/deep"}) {
+        EXPECT_EQ(again.Find(path)->GetSourceFile(), tree.Find(path)->GetSourceFile()) << path;
+    }
+    std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
+    std::unique_ptr<DWXParseTreeNode> leafCopy(deep->Copy());
+    EXPECT_TRUE(copy->Find("s/deep")->GetSourceFile() == deep->GetSourceFile() &&
+                leafCopy->GetSourceFile() == deep->GetSourceFile());
+    EXPECT_EQ(Where(copy->Find("s")) + ", " + Where(leafCopy.get()),
+              Where(tree.Find("s")) + ", " + Where(deep));
+    auto other = Read("\n\n(s SubTree\n(deep Integer 30)\n)\n");
+    tree.SetFrom(other.get(), ExceptionList());
+    EXPECT_EQ(Text(*deep) + " " + Where(deep), "30 2 leaf.cfg@1 mid.cfg@3 main.cfg@0");
+    EXPECT_EQ(Where(other->Find("s/deep")), "4 Memory@0");
+    PTNInteger made("made", 1);
+    EXPECT_EQ(Where(&made), "0");  // not built by the reader
+}
+
+TEST_F(ReaderTest, IncludesNextToTheIncluder) {
+    std::string main = oDir.Write("conf/main.cfg", "(@include part.cfg)\n(m Integer 1)\n");
+    std::string part = oDir.Write("conf/part.cfg", "(near Integer 1)\n(@include sub/deep.cfg)\n");
+    std::string deep = oDir.Write("conf/sub/deep.cfg", "(deep Integer 1)\n(@include etc.cfg)\n");
+    std::string etc = oDir.Write("etc/etc.cfg", "(viaEtc Integer 1)\n");
+    setenv(DWX_ETC_PATH_VARIABLE, oDir.Path("etc").c_str(), 1);
+    for (bool on : {false, true, false}) {
+        PTNSubTree::SetIncludeSearchNextToIncluder(on);
+        PTNSubTree tree("root");
+        PTNReadLog log = ReadLogged(tree, main);
+        EXPECT_EQ(Shape(&tree), on ? "near deep viaEtc m" : "m");
+        EXPECT_EQ(log.Reports().size(), on ? 0u : 1u);
+        EXPECT_EQ(log.Files(), on ? (Texts{main, part, deep, etc}) : Texts{main});
+    }
 }
 
 }  // namespace

@@ -185,4 +185,26 @@ TEST(DWXString, FormatHandlesTextOfAnyLength) {
     EXPECT_EQ("", Bytes(s));
 }
 
+TEST(DWXString, FormattedTextEndsAtANulAndAnEmptyTerminatorIsWritable) {
+    const std::string longText(300, 'a');
+    for (const char* previous : {"", "x", "a block larger than the formatted text, by far"}) {
+        DWXString s(previous);
+        s.Format("a%cb", 0);
+        EXPECT_EQ("a", Bytes(s)) << previous;
+        s = previous;
+        s.Format("%s%c%s", longText.c_str(), 0, "tail");
+        EXPECT_EQ(longText, Bytes(s)) << previous;
+        EXPECT_EQ(600, ProbeCapacity(s));  // sized for the kept text, by the growth rule
+    }
+    EXPECT_EQ("ab", Bytes(DWXFormat("%s%c%s", "ab", 0, "cd")));
+    EXPECT_TRUE(OnNil(DWXFormat("%c", 0)));
+
+    DWXString e, cut("abc");
+    e[e.GetLength()] = '\0';  // chNil is read-only
+    cut.SetLength(0);
+    cut[cut.GetLength()] = '\0';
+    EXPECT_TRUE(OnNil(e));
+    EXPECT_EQ("", Bytes(cut));
+}
+
 }  // namespace

@@ -173,4 +173,37 @@ TEST(MergeTest, ExceptionsFirstMatchesAndClasses) {
               "  ( Integer 0)\n  (s SubTree\n  )\n)\n");
 }
 
+TEST(SubTreeTest, PathsAndRangeFor) {
+    PTNSubTree tree("root");
+    tree.BuildFromString(
+        "(viewer SubTree\n(window SubTree\n(width Integer 640)\n)\n(title String \"t\")\n"
+        "(window SubTree\n(width Integer 800)\n)\n(Window Integer 3)\n)\n(a[0] Integer 9)\n");
+    std::string found;
+    for (const char* path :
+         {"VIEWER/Window/WIDTH", "viewer/window[0]/width", "viewer/window[1]/width",
+          "viewer/window[01]/width", "viewer/window[2]", "viewer/title"}) {
+        DWXParseTreeNode* node = tree.Find(path);
+        found += (node ? Text(*node) : "null") + " ";
+    }
+    EXPECT_EQ(found, "640 640 800 800 3 \"t\" ");  // namesakes count whatever their class
+    EXPECT_EQ(tree.Find("viewer"), tree.GetChild("viewer"));
+    // Not there, through a leaf, and malformed; brackets are always an index.
+    for (const char* path :
+         {"viewer/window[3]", "viewer/title/x", "viewer/nothere/width", "", "/viewer", "viewer/",
+          "viewer//window", "viewer/window[]", "viewer/window[x]", "viewer/window[-1]",
+          "viewer/window[1", "viewer/window[1]x", "viewer/window[99999999999]", "viewer/[0]",
+          "a[0]"}) {
+        EXPECT_EQ(tree.Find(path), nullptr) << path;
+    }
+    EXPECT_EQ(tree.Find(nullptr), nullptr);
+    EXPECT_EQ(tree.FindAs<PTNInteger>("viewer/window[1]/width")->GetValue(), 800);
+    EXPECT_EQ(tree.FindAs<PTNString>("viewer/window/width"), nullptr);
+
+    std::string names;
+    for (DWXParseTreeNode* child : *tree.FindAs<PTNSubTree>("viewer")) {
+        names += child->GetName();
+    }
+    EXPECT_EQ(names, "windowtitlewindowWindow");
+}
+
 }  // namespace

@@ -104,12 +104,43 @@ TEST(UtilhubStringList, AppendCopyAndRelease) {
     EXPECT_EQ(Consume(foreign), (Lines{"a", "b", "c", "e"}));
 }
 
-TEST(UtilhubStringList, LargeListsGrowInAmortisedConstantTime) {
-    const int count = 900000;
-    char** list = nullptr;
-    for (int i = 0; i < count; ++i) {
-        list = AddStringToList(list, i % 2 ? "odd line" : "");
+// Hosts cut lists short by hand and build them in blocks the allocator
+// recycled: whatever lies past the terminator must never be trusted.
+TEST(UtilhubStringList, AppendsAtTheTerminatorOfListsEditedByHand) {
+    char** cut = Tokenize("a b c");
+    free(cut[1]);
+    free(cut[2]);
+    cut[1] = nullptr;  // cut[2] is left dangling, as a host leaves it
+    cut = AddStringToList(cut, "NEW");
+    cut = AddStringToList(cut, "NEXT");
+    EXPECT_EQ(Consume(cut), (Lines{"a", "NEW", "NEXT"}));
+
+    std::string words;
+    for (int i = 0; i < 20; ++i) {
+        words += std::to_string(i) + " ";
     }
+    for (bool bulk : {false, true}) {
+        DestroyStringList(Tokenize(words.c_str()));
+        char** host =
+            static_cast<char**>(malloc(32 * sizeof(char*)));  // often the block just freed
+        host[0] = HString("x");
+        host[1] = nullptr;
+        char* more[] = {const_cast<char*>("y"), const_cast<char*>("z"), nullptr};
+        host = bulk ? AddStringList(host, more) : AddStringToList(host, "y");
+        EXPECT_EQ(Consume(host), bulk ? (Lines{"x", "y", "z"}) : (Lines{"x", "y"}));
+    }
+}
+
+TEST(UtilhubStringList, LargeListsAppendedInOneCall) {
+    const int count = 900000;
+    std::string text;
+    for (int i = 0; i < count / 4; ++i) {  // two lines each, and the list is doubled
+        text += "\nodd line\n";
+    }
+    char** half = BufferToStringList(text.c_str());
+    char** list = AddStringList(nullptr, half);
+    list = AddStringList(list, half);
+    DestroyStringList(half);
     char* buffer = StringListToBuffer(list);
     EXPECT_EQ(strlen(buffer), static_cast<size_t>(count / 2) * 10);
     Lines again = Consume(BufferToStringList(buffer));
@@ -183,14 +214,22 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
     free(joined);
 }
 
-TEST(UtilhubFiles, OnlyReadableRegularFilesPassTheCheck) {
+// Only regular files and the null device (under any name) pass; a FIFO
+// without a writer is refused at once, never waited on.
+TEST(UtilhubFiles, OnlyReadableRegularFilesAndTheNullDevicePassTheCheck) {
     ScratchDir dir;
     std::string file = dir.Write("plain.cfg", "x\n");
     std::string fifo = dir.Path("pipe");
+    std::string nullLink = dir.Path("off.cfg");
     ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    ASSERT_EQ(symlink("/dev/null", nullLink.c_str()), 0);
     EXPECT_EQ(DKCheck(file.c_str()), 1);
-    for (const std::string& path : {dir.Root(), std::string("/dev/null"), std::string("/dev/zero"),
-                                    fifo, dir.Path("missing"), std::string()}) {
+    for (const std::string& path : {std::string("/dev/null"), nullLink}) {
+        EXPECT_EQ(DKCheck(path.c_str()), 1) << path;
+        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), Lines{}) << path;
+    }
+    for (const std::string& path :
+         {dir.Root(), std::string("/dev/zero"), fifo, dir.Path("missing"), std::string()}) {
         EXPECT_EQ(DKCheck(path.c_str()), 0) << path;
         EXPECT_EQ(TextFileToStringList(path.c_str()), nullptr) << path;
         TextLineReader reader;

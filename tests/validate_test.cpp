@@ -44,6 +44,11 @@ TEST(ValidateTest, Answers) {
         {"config SubTree\n", "config", 0},
         {"! only comments\n\n", "config", 0},
         {"", "config", 0},
+        // A UTF-8 byte order mark starts the first line only, as for the reader.
+        {"\xEF\xBB\xBF(config SubTree\n", "config", 1},
+        {"\xEF\xBB\xBF\n# c\n(config SubTree\n", "config", 1},
+        {"\xEF\xBB\xBF", "config", 0},
+        {"\n\xEF\xBB\xBF(config SubTree\n", "config", 0},
     };
     for (const Row& row : rows) {
         EXPECT_EQ(Validate(row.text, row.name), row.answer) << row.text << " / " << row.name;

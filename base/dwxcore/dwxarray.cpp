@@ -144,15 +144,25 @@ void DWXArray::Empty() {
 }
 
 void DWXArray::DestroyContents() {
-    // The slots are taken from the array before any member is deleted, so a
-    // destructor never sees a member that is already gone; a pointer held in
-    // several slots is deleted once.
-    DWXObject** items = ppoItems;
-    int top = nTop;
-    ppoItems = nullptr;
-    nCount = nCapacity = nTop = 0;
-    dwxcore_detail::DeleteEachOnce(items, items ? static_cast<size_t>(top) : 0);
-    free(items);
+    // Each slot is cleared before its member is deleted, and the array is
+    // read afresh at every step: a destructor may remove, delete or add other
+    // members, and whatever it leaves is what the walk goes on with. A walk
+    // that passes the top starts again from slot 0 while members remain, for
+    // those a destructor placed below it. O(n) without repeated pointers.
+    nCount -= static_cast<int>(dwxcore_detail::ClearRepeats(ppoItems, static_cast<size_t>(nTop)));
+    int slot = 0;
+    while (nCount > 0) {
+        if (slot >= nTop) {
+            slot = 0;
+        }
+        DWXObject* member = ppoItems[slot];
+        if (member) {
+            ppoItems[slot] = nullptr;
+            --nCount;
+            delete member;
+        }
+        ++slot;
+    }
     Empty();
 }
 
@@ -257,18 +267,18 @@ void DWXArray::Reverse() {
 }
 
 void DWXArray::Sort(int (*compare)(const void*, const void*)) {
+    Pack();  // also without a comparator: callers rely on the holes being gone
     if (!compare) {
         return;
     }
-    Pack();
     dwxcore_detail::QuickSort(ppoItems, nCount, sizeof(DWXObject*), compare);
 }
 
 void DWXArray::StandartSort(int (*compare)(const void*, const void*)) {
+    Pack();  // also without a comparator: callers rely on the holes being gone
     if (!compare) {
         return;
     }
-    Pack();
     if (nCount > 1) {
         TZN_qsort(ppoItems, nCount, sizeof(DWXObject*), compare);
     }

@@ -1,8 +1,11 @@
 #include <dwxcore/dwxobject.h>
 
+#include "dwxcontainer_internal.h"
+
 #include <services/rtprim.h>
 
 #include <stdlib.h>
+#include <string.h>
 #include <climits>
 
 DWXBag::DWXBag() : nCapacity(0), ppoItems(nullptr) {}
@@ -108,4 +111,37 @@ void DWXBag::Empty() {
     free(ppoItems);
     ppoItems = nullptr;
     nCount = nCapacity = 0;
+}
+
+void DWXBag::DestroyInOrder() {
+    // A walk ends at the first null member: only the members before it are
+    // deleted, a pointer held twice among them once. Its repeats are taken
+    // out first, keeping the order of the rest.
+    int walked = 0;
+    while (walked < nCount && ppoItems[walked]) {
+        ++walked;
+    }
+    int repeats = static_cast<int>(dwxcore_detail::ClearRepeats(ppoItems, walked));
+    if (repeats > 0) {
+        int kept = 0;
+        for (int i = 0; i < walked; ++i) {
+            if (ppoItems[i]) {
+                ppoItems[kept++] = ppoItems[i];
+            }
+        }
+        memmove(ppoItems + kept, ppoItems + walked, (nCount - walked) * sizeof(DWXObject*));
+        nCount -= repeats;
+    }
+    // The bag is read afresh at every step, since a destructor may remove or
+    // add members. The slots cleared so far all lie behind the walk, so a null
+    // ahead of it is a stored one, where the walk ends. O(n).
+    for (int i = 0; i < nCount; ++i) {
+        DWXObject* member = ppoItems[i];
+        if (!member) {
+            break;
+        }
+        ppoItems[i] = nullptr;
+        delete member;
+    }
+    Empty();
 }

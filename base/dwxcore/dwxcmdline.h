@@ -45,7 +45,7 @@ class DWXCORE_API DWXCmdLine : public DWXObject {
     DWXCmdLine(int count, const char* const* vector);
     // Parses one command string split at blanks (no quoting); its first word
     // plays the program name.
-    explicit DWXCmdLine(const char* command);
+    DWXCmdLine(const char* command);
     DWXCmdLine(const DWXCmdLine& other);
     DWXCmdLine& operator=(const DWXCmdLine& other);
     ~DWXCmdLine() override;

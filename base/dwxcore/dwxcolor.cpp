@@ -8,6 +8,9 @@
 #include <stdlib.h>
 #include <string.h>
 
+#include <atomic>
+#include <mutex>
+
 namespace {
 
 struct ColorRow {
@@ -55,10 +58,19 @@ struct NamedColor {
 
 // The process-wide registry: made on first use, released at exit. Entries stay
 // in order of registration; names are unique ignoring case.
+//
+// Threads: the first use may come from several threads at once, so making
+// the registry is locked, and gReady publishes it; lookups then read it
+// without a lock. Additions take the lock too, but a lookup on another
+// thread during an addition is the host's race to avoid.
 NamedColor** gEntries = nullptr;
 int gEntryCount = 0;
+std::mutex gRegistryLock;
+std::atomic<bool> gReady{false};
 
 void ReleaseRegistry() {
+    std::lock_guard<std::mutex> guard(gRegistryLock);
+    gReady.store(false, std::memory_order_relaxed);
     for (int i = 0; i < gEntryCount; ++i) {
         free(gEntries[i]->name);
         free(gEntries[i]);
@@ -77,6 +89,7 @@ NamedColor* FindByName(const char* name) {
     return nullptr;
 }
 
+// Adds or changes an entry; the caller holds gRegistryLock.
 void Register(const char* name, unsigned char red, unsigned char green, unsigned char blue) {
     NamedColor* entry = FindByName(name);
     if (entry == nullptr) {
@@ -92,15 +105,19 @@ void Register(const char* name, unsigned char red, unsigned char green, unsigned
 }
 
 void EnsureRegistry() {
-    if (gEntries != nullptr) {
+    if (gReady.load(std::memory_order_acquire)) {
         return;
     }
-    gEntries = static_cast<NamedColor**>(HMalloc(sizeof(NamedColor*)));
-    gEntryCount = 0;
-    for (const ColorRow& row : gDisplayColors.rows) {
-        Register(row.name, row.red, row.green, row.blue);
+    std::lock_guard<std::mutex> guard(gRegistryLock);
+    if (gEntries == nullptr) {
+        gEntries = static_cast<NamedColor**>(HMalloc(sizeof(NamedColor*)));
+        gEntryCount = 0;
+        for (const ColorRow& row : gDisplayColors.rows) {
+            Register(row.name, row.red, row.green, row.blue);
+        }
+        _IMPAtExit(ReleaseRegistry, "base/dwxcore/dwxcolor", 94);
     }
-    _IMPAtExit(ReleaseRegistry, "base/dwxcore/dwxcolor", 94);
+    gReady.store(true, std::memory_order_release);
 }
 
 }  // namespace
@@ -189,6 +206,9 @@ DWXString DWXColor::GetRGBName() const {
 }
 
 void DWXColor::Dump(FILE* stream) const {
+    if (!stream) {
+        return;
+    }
     fprintf(stream, "<DWXColor:%d,%d,%d>\n", nRed, nGreen, nBlue);
 }
 
@@ -201,6 +221,7 @@ void AddNamedColor(const char* name, const DWXColor& color) {
         return;
     }
     EnsureRegistry();
+    std::lock_guard<std::mutex> guard(gRegistryLock);
     Register(name, static_cast<unsigned char>(color.GetRed()),
              static_cast<unsigned char>(color.GetGreen()),
              static_cast<unsigned char>(color.GetBlue()));
@@ -208,6 +229,7 @@ void AddNamedColor(const char* name, const DWXColor& color) {
 
 char** GetNamedColors() {
     EnsureRegistry();
+    std::lock_guard<std::mutex> guard(gRegistryLock);
     char** names =
         static_cast<char**>(HMalloc(sizeof(char*) * static_cast<size_t>(gEntryCount + 1)));
     for (int i = 0; i < gEntryCount; ++i) {

@@ -60,6 +60,7 @@ class DWXCORE_API DWXColor : public DWXObject {
 // Registers `name` for the colour's red, green and blue, or, when a name equal
 // ignoring case is registered already, changes that entry's components (its
 // stored name keeps its spelling). Alpha is ignored; a null name does nothing.
+// Call it while no other thread uses colours: lookups read the registry unlocked.
 DWXCORE_API void AddNamedColor(const char* name, const DWXColor& color);
 
 // Every registered name in order of registration, followed by a null pointer.

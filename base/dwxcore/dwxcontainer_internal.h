@@ -7,8 +7,15 @@
 
 namespace dwxcore_detail {
 
-// Deletes every non-null pointer of members[0, count) in order, each distinct
-// pointer once: a container may hold the same object in several places.
-void DeleteEachOnce(DWXObject* const* members, size_t count);
+// Clears every entry of items[0, count) that repeats an earlier non-null
+// entry, so that a pointer held in several places is deleted once; returns
+// the number of entries cleared. O(n) up to 16 entries, else O(n log n) to
+// find out whether there are repeats at all, plus O(n) expected when there are.
+size_t ClearRepeats(DWXObject** items, size_t count);
+
+// DestroyContents of a linked list: in list order, each node is unlinked
+// before its member is deleted, and the next member is read from the list
+// as that destructor left it. O(n).
+void DestroyListContents(DWXLinkedList& list);
 
 }  // namespace dwxcore_detail

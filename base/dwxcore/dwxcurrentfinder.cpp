@@ -2,10 +2,15 @@
 
 #include <services/utilhub.h>
 
+#include <mutex>
 #include <set>
 #include <utility>
 
 namespace {
+
+// Guards making and dropping the singleton, so that first requests from
+// several threads make one registry. The table itself has no lock.
+std::mutex gInstanceLock;
 
 std::string NameOf(const char* name) {
     return name != nullptr ? std::string(name) : std::string();
@@ -88,7 +93,9 @@ DWXCurrentFinder::DWXCurrentFinder() {
 
 DWXCurrentFinder::~DWXCurrentFinder() {}
 
+// Constant time: one uncontended lock.
 DWXCurrentFinder* DWXCurrentFinder::GetInstance() {
+    std::lock_guard<std::mutex> guard(gInstanceLock);
     if (mpoUniqueInstance == nullptr) {
         mpoUniqueInstance = new DWXCurrentFinder;
     }
@@ -98,8 +105,12 @@ DWXCurrentFinder* DWXCurrentFinder::GetInstance() {
 // The singleton is detached before it is deleted, so an object's destructor
 // that asks for the registry never gets the one being destroyed.
 void DWXCurrentFinder::ExitCB() {
-    DWXCurrentFinder* registry = mpoUniqueInstance;
-    mpoUniqueInstance = nullptr;
+    DWXCurrentFinder* registry;
+    {
+        std::lock_guard<std::mutex> guard(gInstanceLock);
+        registry = mpoUniqueInstance;
+        mpoUniqueInstance = nullptr;
+    }
     delete registry;
 }
 

@@ -54,7 +54,8 @@ extern template class DWXCORE_API CurrentFinder<DWXObject>;
 
 // The one registry the library hands out. It is made on first request and
 // deleted, with every object it holds, at process exit; a request after that
-// makes a fresh, empty registry. Not thread-safe: use it from one thread.
+// makes a fresh, empty registry. Any thread may ask for it; its table has no
+// lock, so no thread may change it while another uses it.
 class DWXCORE_API DWXCurrentFinder : public CurrentFinder<DWXObject> {
   public:
     ~DWXCurrentFinder() override;

@@ -23,8 +23,9 @@ const char kInvalidMonth[] = "Invalid Month for DWXDate Object (month, day, year
 const char kInvalidDay[] = "Invalid Day for DWXDate Object (month, day, year):  %d %d %d.\n";
 const char kInvalidYear[] = "Invalid Year for DWXDate Object (month, day, year):  %d %d %d.\n";
 
-// Shared by every GetString call without a buffer.
-char gStaticText[24];
+// Shared by every GetString call without a buffer on one thread; each thread
+// has its own, so dates on different threads never write into each other's text.
+thread_local char gStaticText[24];
 
 // Days in a 400-, 100- and 4-year cycle of the Gregorian calendar.
 const int64_t kDaysPer400 = 146097;
@@ -165,14 +166,20 @@ void DWXDate::SetDayOfYear(int dayOfYear) {
 }
 
 void DWXDate::SetToday() {
-    int day = 0;
-    int month = 0;
-    int year = 0;
+    // "day-month-year", read as "%d-%d-%d" reads it in the "C" locale.
+    int parts[3] = {0, 0, 0};
     const char* text = IMPTime(nullptr, 10);
-    if (text == nullptr || sscanf(text, "%d-%d-%d", &day, &month, &year) != 3) {
-        return;
+    for (int i = 0; i < 3; ++i) {
+        char* end = nullptr;
+        long value = TZN_strtol(text, &end, 10);
+        if (text == nullptr || end == text || value < INT_MIN || value > INT_MAX ||
+            (i < 2 && *end != '-')) {
+            return;
+        }
+        parts[i] = static_cast<int>(value);
+        text = i < 2 ? end + 1 : end;
     }
-    SetDate(month, day, year);
+    SetDate(parts[1], parts[0], parts[2]);
 }
 
 int DWXDate::GetDayOfYear() const {

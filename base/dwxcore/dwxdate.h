@@ -78,8 +78,9 @@ class DWXCORE_API DWXDate {
     // Writes "Month day, year" ("July 4, 1776"; month 0 is "zero", a month
     // outside 0 to 12 is "invalid") into `buffer` and returns it. The caller's
     // buffer must hold the whole text (at most 35 bytes). With a null buffer
-    // the text goes to one static buffer shared by all dates, cut to 23
-    // characters; it is borrowed and overwritten by the next such call.
+    // the text goes to a static buffer shared by all dates of the calling
+    // thread (one per thread), cut to 23 characters; it is borrowed and
+    // overwritten by the next such call on the same thread.
     char* GetString(char* buffer = nullptr) const;
 
   private:

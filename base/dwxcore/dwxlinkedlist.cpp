@@ -1,5 +1,9 @@
 #include <dwxcore/dwxobject.h>
 
+#include "dwxcontainer_internal.h"
+
+#include <vector>
+
 namespace {
 
 // Takes `node` out of its ring; the caller deletes it.
@@ -148,3 +152,36 @@ void DWXLinkedList::Remove(DWXListNode* node) {
     delete node;
     --nCount;
 }
+
+namespace dwxcore_detail {
+
+void DestroyListContents(DWXLinkedList& list) {
+    // A walk ends at the first null member: only the nodes before it count,
+    // and of several nodes holding the same pointer only the first stays.
+    std::vector<DWXListNode*> nodes;
+    std::vector<DWXObject*> members;
+    for (DWXListNode* node = list.StartNode(); node != list.EndNode() && node->poObject;
+         node = node->poNext) {
+        nodes.push_back(node);
+        members.push_back(node->poObject);
+    }
+    if (ClearRepeats(members.data(), members.size()) > 0) {
+        for (size_t i = 0; i < nodes.size(); ++i) {
+            if (!members[i]) {
+                list.Remove(nodes[i]);
+            }
+        }
+    }
+    for (;;) {
+        DWXListNode* first = list.StartNode();
+        DWXObject* member = first->poObject;
+        if (first == list.EndNode() || !member) {
+            break;
+        }
+        list.Remove(first);
+        delete member;
+    }
+    list.Empty();
+}
+
+}  // namespace dwxcore_detail

@@ -91,8 +91,39 @@ void DWXContainer::AddContainer(const DWXContainer* other) {
 }
 
 void DWXContainer::DestroyContents() {
-    std::vector<DWXObject*> members = Snapshot(this);
-    dwxcore_detail::DeleteEachOnce(members.data(), members.size());
+    // Every container of the library has a walk of its own that takes each
+    // member out before deleting it, so a destructor that removes or deletes
+    // other members never leaves a pointer behind to be deleted again.
+    if (DWXArray* array = dynamic_cast<DWXArray*>(this)) {
+        array->DWXArray::DestroyContents();
+        return;
+    }
+    if (DWXBag* bag = dynamic_cast<DWXBag*>(this)) {
+        bag->DestroyInOrder();
+        return;
+    }
+    if (DWXLinkedList* list = dynamic_cast<DWXLinkedList*>(this)) {
+        dwxcore_detail::DestroyListContents(*list);
+        return;
+    }
+    // A host's container: take the first member out wherever it is held,
+    // then delete it, and start again. O(n^2) in general.
+    DWXIter iter;
+    for (DWXObject* member = iter.Start(this); member; member = iter.Start(this)) {
+        if (!Remove(member)) {
+            // A Remove that refuses what Start yields: delete what the walk
+            // still meets, each pointer once.
+            std::vector<DWXObject*> rest = Snapshot(this);
+            dwxcore_detail::ClearRepeats(rest.data(), rest.size());
+            for (DWXObject* other : rest) {
+                delete other;
+            }
+            break;
+        }
+        while (Remove(member)) {
+        }
+        delete member;
+    }
     Empty();
 }
 
@@ -141,6 +172,10 @@ DWXIter& DWXIter::operator++() {
 }
 
 void DWXIter::SetTarget(const DWXContainer* container) {
+    if (container != poTarget) {
+        // An array's slot index read as a list node would crash the list.
+        nPosition = 0;
+    }
     poTarget = container;
     poCurrent = nullptr;
 }
@@ -151,37 +186,37 @@ DWXValidatable::~DWXValidatable() {}
 
 namespace dwxcore_detail {
 
-void DeleteEachOnce(DWXObject* const* members, size_t count) {
-    // Duplicates are rare (AddContainer of a container into itself), so look
-    // for them cheaply first and pay for a set only when there are some.
-    bool duplicates = false;
+size_t ClearRepeats(DWXObject** items, size_t count) {
+    // Repeats are rare (AddContainer of a container into itself), so look for
+    // them cheaply first and pay for a set only when there are some.
+    bool repeats = false;
     if (count <= 16) {
-        for (size_t i = 1; i < count && !duplicates; ++i) {
+        for (size_t i = 1; i < count && !repeats; ++i) {
             for (size_t j = 0; j < i; ++j) {
-                if (members[i] && members[j] == members[i]) {
-                    duplicates = true;
+                if (items[i] && items[j] == items[i]) {
+                    repeats = true;
                     break;
                 }
             }
         }
     } else {
-        std::vector<DWXObject*> sorted(members, members + count);
+        std::vector<DWXObject*> sorted(items, items + count);
         sorted.erase(std::remove(sorted.begin(), sorted.end(), nullptr), sorted.end());
         std::sort(sorted.begin(), sorted.end());
-        duplicates = std::adjacent_find(sorted.begin(), sorted.end()) != sorted.end();
+        repeats = std::adjacent_find(sorted.begin(), sorted.end()) != sorted.end();
     }
-    if (!duplicates) {
-        for (size_t i = 0; i < count; ++i) {
-            delete members[i];
-        }
-        return;
+    if (!repeats) {
+        return 0;
     }
-    std::unordered_set<DWXObject*> deleted;
+    size_t cleared = 0;
+    std::unordered_set<DWXObject*> seen;
     for (size_t i = 0; i < count; ++i) {
-        if (members[i] && deleted.insert(members[i]).second) {
-            delete members[i];
+        if (items[i] && !seen.insert(items[i]).second) {
+            items[i] = nullptr;
+            ++cleared;
         }
     }
+    return cleared;
 }
 
 }  // namespace dwxcore_detail

@@ -8,7 +8,12 @@
 #include <stdint.h>
 #include <stdio.h>
 
+#include <cstddef>
+#include <iterator>
+
 class DWXIter;
+template <class T>
+class DWXRangeIter;
 
 // Root of every class with an identity. Deleting through a DWXObject* is safe.
 class DWXCORE_API DWXObject {
@@ -68,6 +73,11 @@ class DWXCORE_API DWXContainer : public DWXObject {
     // 1 unless a member that derives from DWXValidatable answers 0.
     virtual int Validate() const;
 
+    // For range-for: for (DWXObject* o : container) visits what a DWXIter
+    // visits, in the same order, and ends where it ends.
+    DWXRangeIter<DWXObject> begin() const;
+    DWXRangeIter<DWXObject> end() const;
+
     int GetCount() const { return nCount; }
     int IsEmpty() const { return nCount == 0 ? 1 : 0; }
 
@@ -76,7 +86,8 @@ class DWXCORE_API DWXContainer : public DWXObject {
     // snapshot of its members, so they end up there twice.
     void AddContainer(const DWXContainer* other);
     // Deletes the members met by a walk, each distinct pointer once, then
-    // empties the container.
+    // empties the container. Each member is taken out before it is deleted,
+    // so its destructor may remove, delete or add other members.
     void DestroyContents();
 
   protected:
@@ -100,8 +111,9 @@ class DWXCORE_API DWXIter : public DWXObject {
 
   public:
     DWXIter();
-    // Binds to `container` and, when it is not null, stands on its first member.
-    explicit DWXIter(const DWXContainer* container);
+    // Binds to `container` and, when it is not null, stands on its first
+    // member. Implicit, so that hosts may write `DWXIter iter = &array;`.
+    DWXIter(const DWXContainer* container);
     DWXIter(const DWXIter& other) = default;
     DWXIter& operator=(const DWXIter& other) = default;
     ~DWXIter() override;
@@ -116,7 +128,9 @@ class DWXCORE_API DWXIter : public DWXObject {
     DWXIter& operator++();
     DWXObject* operator*() const { return poCurrent; }
     DWXObject* Current() const { return poCurrent; }
-    // Binds without starting and keeps the position; call Start next.
+    // Binds without starting; call Start next. The position is kept only when
+    // the container is the one already bound: a position belongs to the
+    // container that set it, so another container begins from its first member.
     void SetTarget(const DWXContainer* container);
 
   protected:
@@ -124,6 +138,47 @@ class DWXCORE_API DWXIter : public DWXObject {
     DWXObject* poCurrent;
     int64_t nPosition;
 };
+
+// The walk of a DWXIter as an input iterator, for range-for and algorithms.
+// T is the class the container's owner guarantees for its members (members
+// are handed out with static_cast). The end iterator is default-constructed;
+// a walk is at its end when its DWXIter yields null.
+template <class T>
+class DWXRangeIter : private DWXIter {
+  public:
+    using iterator_category = std::input_iterator_tag;
+    using value_type = T*;
+    using difference_type = std::ptrdiff_t;
+    using pointer = T* const*;
+    using reference = T*;
+
+    DWXRangeIter() {}
+    // Stands on the first member of `container` (null: at the end).
+    explicit DWXRangeIter(const DWXContainer* container) : DWXIter(container) {}
+
+    T* operator*() const { return static_cast<T*>(poCurrent); }
+    DWXRangeIter& operator++() {
+        Next();
+        return *this;
+    }
+    // Two walks are equal when both are at their end, or when they stand on
+    // the same place of the same container.
+    bool operator==(const DWXRangeIter& other) const {
+        if (!poCurrent || !other.poCurrent) {
+            return !poCurrent && !other.poCurrent;
+        }
+        return poTarget == other.poTarget && nPosition == other.nPosition &&
+               poCurrent == other.poCurrent;
+    }
+    bool operator!=(const DWXRangeIter& other) const { return !(*this == other); }
+};
+
+inline DWXRangeIter<DWXObject> DWXContainer::begin() const {
+    return DWXRangeIter<DWXObject>(this);
+}
+inline DWXRangeIter<DWXObject> DWXContainer::end() const {
+    return DWXRangeIter<DWXObject>();
+}
 
 // Mix-in for objects that can check themselves. A member of a container takes
 // part in DWXContainer::Validate when its class derives from both DWXObject
@@ -148,7 +203,7 @@ class DWXCORE_API DWXArray : public DWXContainer {
     DWXArray();
     // The members of `container` in its walk order, without holes. A null
     // `container` gives an empty array.
-    explicit DWXArray(const DWXContainer* container);
+    DWXArray(const DWXContainer* container);
     // An own buffer with the members of `other` in order, without holes.
     DWXArray(const DWXArray& other);
     DWXArray& operator=(const DWXArray& other);
@@ -207,7 +262,8 @@ class DWXCORE_API DWXArray : public DWXContainer {
     // Reverses the order of the members and closes the holes.
     void Reverse();
     // Packs, then sorts with the library's quicksort. `compare` receives two
-    // pointers to DWXObject* slots, as for qsort; equal members may move.
+    // pointers to DWXObject* slots, as for qsort; equal members may move. A
+    // null `compare` only packs (likewise for StandartSort).
     void Sort(int (*compare)(const void*, const void*));
     // Packs, then sorts with the service layer's TZN_qsort.
     void StandartSort(int (*compare)(const void*, const void*));
@@ -234,7 +290,7 @@ class DWXCORE_API DWXPackedArray : public DWXArray {
   public:
     DWXPackedArray();
     // A null `container` gives an empty array.
-    explicit DWXPackedArray(const DWXContainer* container);
+    DWXPackedArray(const DWXContainer* container);
     DWXPackedArray(const DWXPackedArray& other);
     DWXPackedArray& operator=(const DWXPackedArray& other);
     ~DWXPackedArray() override;
@@ -247,11 +303,13 @@ class DWXCORE_API DWXPackedArray : public DWXArray {
 // 1.3 plus 5. Stores null pointers too; a walk ends at the first null member.
 // Owns its buffer, never its members.
 class DWXCORE_API DWXBag : public DWXContainer {
+    friend class DWXContainer;
+
   public:
     DWXBag();
     // The members of `container` in its walk order. A null `container` gives
     // an empty bag.
-    explicit DWXBag(const DWXContainer* container);
+    DWXBag(const DWXContainer* container);
     DWXBag(const DWXBag& other);
     DWXBag& operator=(const DWXBag& other);
     ~DWXBag() override;
@@ -273,6 +331,11 @@ class DWXCORE_API DWXBag : public DWXContainer {
   protected:
     int nCapacity;
     DWXObject** ppoItems;
+
+  private:
+    // DestroyContents of a bag: in slot order, each slot is cleared before its
+    // member is deleted.
+    void DestroyInOrder();
 };
 
 // A node of a DWXLinkedList; created and deleted by the list alone.

@@ -16,8 +16,64 @@
 
 #include <new>
 #include <string>
+#include <vector>
 
 class PTNSubTree;
+
+// Where a node was read from: a file as the reader opened it ("Memory" for a
+// buffer) and, for an included file, the file and line of the directive that
+// included it (`includedBy` null for the file the read started from). Records
+// are shared by every node read from the same place and live as long as the
+// process; the same file reached by the same chain always gives the same
+// record, so reading the same files again allocates none.
+struct PTNSourceFile {
+    const char* name;
+    const PTNSourceFile* includedBy;
+    int includedAtLine;
+};
+
+// One report of a read: what the reader would give IMPError, or a warning
+// about a line that was dropped or read differently from how it looks.
+// `file` and `line` name the place it arose: the included file and its own
+// line for a line inside an include, "Memory" for a buffer; lines count from 1.
+struct PTNReadReport {
+    int code;
+    int severity;
+    std::string file;
+    int line;
+    std::string message;
+};
+
+// What one or more reads given this log met. Reports and files accumulate
+// over the reads it is given. Warnings go only here, never to IMPError.
+class PTNReadLog {
+  public:
+    // Codes of the warnings (severity 3).
+    enum WarningCode {
+        kUnknownKeyword = 101,  // a type keyword the reader builds nothing for
+        kTopLevelClose,         // a closing line outside every subtree: the rest is not read
+        kBlankAfterParen,       // "( name": the name is empty, the next word is the keyword
+        kIntegerText,           // an Integer value that is not a number or does not fit in int
+        kDoubleText,            // a Double value that is not a number
+        kJoinedString           // a String whose value tokens were joined
+    };
+
+    // True when there are no reports; warnings do not count.
+    bool Ok() const { return oReports.empty(); }
+    const std::vector<PTNReadReport>& Reports() const { return oReports; }
+    const std::vector<PTNReadReport>& Warnings() const { return oWarnings; }
+    // Every file opened, once each, in the order first opened; the file a
+    // read started from comes before the files it includes.
+    const std::vector<std::string>& Files() const { return oFiles; }
+
+  private:
+    friend struct PTNReadLogWriter;  // the reader's access
+
+    std::vector<PTNReadReport> oReports;
+    std::vector<PTNReadReport> oWarnings;
+    std::vector<std::string> oFiles;
+    std::vector<std::string> oCanonicalFiles;  // the same files by canonical path
+};
 
 // Base of every node: a name owned by the node and a borrowed pointer to the
 // subtree that holds it (null until the node is added to one).
@@ -51,6 +107,12 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
     void SetParent(PTNSubTree* parent) { poParent = parent; }
     PTNSubTree* GetParentRef() const { return poParent; }
 
+    // The line the reader built this node from; 0 for a node it did not build.
+    int GetSourceLine() const { return nSourceLine; }
+    // The file of that line; null for a node the reader did not build.
+    // Borrowed; valid as long as the process.
+    const PTNSourceFile* GetSourceFile() const { return poSource; }
+
     const char* GetClassName() const override = 0;
     // A new node of the same class with its own copies of name and value and
     // a null parent. Caller owns it.
@@ -62,12 +124,21 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
     virtual void SetFrom(DWXParseTreeNode* other) = 0;
 
   protected:
-    // Copies the name; the copy has a null parent.
+    // Copies the name and the source; the copy has a null parent.
     DWXParseTreeNode(const DWXParseTreeNode& other);
-    // Copies the name; the parent stays, as the node stays where it is.
+    // Copies the name; the parent and the source stay, as the node stays
+    // where it is.
     DWXParseTreeNode& operator=(const DWXParseTreeNode& other);
+    // Gives `copy`, a copy of this node, this node's source; returns `copy`.
+    DWXParseTreeNode* KeepSource(DWXParseTreeNode* copy) const {
+        copy->poSource = poSource;
+        copy->nSourceLine = nSourceLine;
+        return copy;
+    }
 
   private:
+    friend struct PTNSourceSetter;  // the reader records where it built a node
+
     // A name this short (its terminator included) is kept in the node
     // itself, which saves most nodes a block of their own; a longer one comes
     // from the node pool. pcName points at whichever storage holds the name
@@ -83,6 +154,8 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
     char* pcName;
     PTNSubTree* poParent;
     char acShortName[kShortName];
+    const PTNSourceFile* poSource;
+    int nSourceLine;
 };
 
 // ---------------------------------------------------------------------------
@@ -455,6 +528,26 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     // The number of direct children of that name; 0 for null.
     int GetNumberOfOccurence(const char* name) const;
 
+    // The node at `path`: names separated by '/', each compared as GetChild
+    // compares and looked up among the children of the subtree the path has
+    // reached; "name[N]" takes the N-th child of that name, counting from 0.
+    // Null for a null or empty path, a malformed one (an empty segment, an
+    // index that is not a decimal number), a step through a leaf, and a name
+    // that is not there. Borrowed. Each step costs one GetChild lookup; a
+    // step with an index walks that subtree's children once.
+    DWXParseTreeNode* Find(const char* path) const;
+    // Find, null also when the node is not a T.
+    template <class T>
+    T* FindAs(const char* path) const {
+        return dynamic_cast<T*>(Find(path));
+    }
+
+    // The children in order, for range-for: for (DWXParseTreeNode* c : tree).
+    DWXRangeIter<DWXParseTreeNode> begin() const {
+        return DWXRangeIter<DWXParseTreeNode>(&oChildren);
+    }
+    DWXRangeIter<DWXParseTreeNode> end() const { return DWXRangeIter<DWXParseTreeNode>(); }
+
     const char* GetClassName() const override;
     // A deep copy owned by the caller.
     DWXParseTreeNode* Copy() override;
@@ -483,6 +576,16 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     void BuildFromFile(FILE* stream);
     // The same for a text buffer; null does nothing.
     void BuildFromString(const char* buffer);
+    // The same reads with a log (null: as without one). Every report goes to
+    // the log instead of IMPError, warnings are added, and the files opened
+    // are listed. A corrupt line ends the read as it would without a log, but
+    // no exception leaves the call.
+    void BuildFromFile(FILE* stream, PTNReadLog* log);
+    void BuildFromString(const char* buffer, PTNReadLog* log);
+    // Process-wide, off by default. When on, an include with a relative name
+    // is looked for first in the directory of the file holding the
+    // directive, then in the working directory and the "etc" and "pro" searches.
+    static void SetIncludeSearchNextToIncluder(bool on);
     // Reads from `lines` until a closing line or the end of the list.
     // `fileName` names the source in reports (null: "Memory"). Counting starts
     // at *lineCounter and the count is stored back (lineCounter may be null).

@@ -383,7 +383,7 @@ DWXParseTreeNode* PTNBase64::Copy() {
     unsigned char* bytes = Decode(nullptr, &length);
     DWXParseTreeNode* copy = new PTNBase64(GetName(), bytes, length);
     free(bytes);
-    return copy;
+    return KeepSource(copy);
 }
 
 char* PTNBase64::GetAsString() const {

@@ -146,7 +146,7 @@ const char* PTNStringList::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNStringList::Copy() {
-    return new PTNStringList(GetName(), ppcValue);
+    return KeepSource(new PTNStringList(GetName(), ppcValue));
 }
 
 char* PTNStringList::GetAsString() const {
@@ -177,7 +177,9 @@ PTNIntegerList::PTNIntegerList(const char* name, int count, const int* values)
 }
 
 PTNIntegerList::PTNIntegerList(const PTNIntegerList& other)
-    : PTNIntegerList(other.GetName(), other.nCount, other.pnValues) {}
+    : PTNIntegerList(other.GetName(), other.nCount, other.pnValues) {
+    other.KeepSource(this);
+}
 
 PTNIntegerList& PTNIntegerList::operator=(const PTNIntegerList& other) {
     if (this != &other) {
@@ -211,7 +213,7 @@ const char* PTNIntegerList::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNIntegerList::Copy() {
-    return new PTNIntegerList(GetName(), nCount, pnValues);
+    return KeepSource(new PTNIntegerList(GetName(), nCount, pnValues));
 }
 
 char* PTNIntegerList::GetAsString() const {
@@ -234,7 +236,9 @@ PTNInteger32List::PTNInteger32List(const char* name, int count, const int* value
 }
 
 PTNInteger32List::PTNInteger32List(const PTNInteger32List& other)
-    : PTNInteger32List(other.GetName(), other.nCount, other.pnValues) {}
+    : PTNInteger32List(other.GetName(), other.nCount, other.pnValues) {
+    other.KeepSource(this);
+}
 
 PTNInteger32List& PTNInteger32List::operator=(const PTNInteger32List& other) {
     if (this != &other) {
@@ -268,7 +272,7 @@ const char* PTNInteger32List::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNInteger32List::Copy() {
-    return new PTNInteger32List(GetName(), nCount, pnValues);
+    return KeepSource(new PTNInteger32List(GetName(), nCount, pnValues));
 }
 
 char* PTNInteger32List::GetAsString() const {
@@ -291,7 +295,9 @@ PTNDoubleList::PTNDoubleList(const char* name, int count, const double* values)
 }
 
 PTNDoubleList::PTNDoubleList(const PTNDoubleList& other)
-    : PTNDoubleList(other.GetName(), other.nCount, other.pdValues) {}
+    : PTNDoubleList(other.GetName(), other.nCount, other.pdValues) {
+    other.KeepSource(this);
+}
 
 PTNDoubleList& PTNDoubleList::operator=(const PTNDoubleList& other) {
     if (this != &other) {
@@ -325,7 +331,7 @@ const char* PTNDoubleList::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNDoubleList::Copy() {
-    return new PTNDoubleList(GetName(), nCount, pdValues);
+    return KeepSource(new PTNDoubleList(GetName(), nCount, pdValues));
 }
 
 char* PTNDoubleList::GetAsString() const {

@@ -42,12 +42,17 @@ char* HeapText(char* buffer, char* end) {
 // ---------------------------------------------------------------------------
 // DWXParseTreeNode
 
-DWXParseTreeNode::DWXParseTreeNode(const char* name) : pcName(nullptr), poParent(nullptr) {
+DWXParseTreeNode::DWXParseTreeNode(const char* name)
+    : pcName(nullptr), poParent(nullptr), poSource(nullptr), nSourceLine(0) {
     InitName(name);
 }
 
 DWXParseTreeNode::DWXParseTreeNode(const DWXParseTreeNode& other)
-    : DWXObject(other), pcName(nullptr), poParent(nullptr) {
+    : DWXObject(other),
+      pcName(nullptr),
+      poParent(nullptr),
+      poSource(other.poSource),
+      nSourceLine(other.nSourceLine) {
     InitName(other.pcName);
 }
 
@@ -142,7 +147,7 @@ const char* PTNBool::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNBool::Copy() {
-    return new PTNBool(GetName(), nValue);
+    return KeepSource(new PTNBool(GetName(), nValue));
 }
 
 char* PTNBool::GetAsString() const {
@@ -170,7 +175,7 @@ const char* PTNChar::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNChar::Copy() {
-    return new PTNChar(GetName(), cValue);
+    return KeepSource(new PTNChar(GetName(), cValue));
 }
 
 char* PTNChar::GetAsString() const {
@@ -200,7 +205,7 @@ const char* PTNInteger::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNInteger::Copy() {
-    return new PTNInteger(GetName(), nValue);
+    return KeepSource(new PTNInteger(GetName(), nValue));
 }
 
 char* PTNInteger::GetAsString() const {
@@ -229,7 +234,7 @@ const char* PTNFloat::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNFloat::Copy() {
-    return new PTNFloat(GetName(), fValue);
+    return KeepSource(new PTNFloat(GetName(), fValue));
 }
 
 char* PTNFloat::GetAsString() const {
@@ -258,7 +263,7 @@ const char* PTNDouble::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNDouble::Copy() {
-    return new PTNDouble(GetName(), dValue);
+    return KeepSource(new PTNDouble(GetName(), dValue));
 }
 
 char* PTNDouble::GetAsString() const {
@@ -330,7 +335,7 @@ const char* PTNString::GetClassName() const {
 }
 
 DWXParseTreeNode* PTNString::Copy() {
-    return new PTNString(GetName(), pcValue);
+    return KeepSource(new PTNString(GetName(), pcValue));
 }
 
 char* PTNString::GetAsString() const {

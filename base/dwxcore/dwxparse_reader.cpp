@@ -18,14 +18,18 @@
 #include <services/tracer.h>
 #include <services/utilhub.h>
 
+#include <errno.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
 
+#include <atomic>
 #include <filesystem>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <system_error>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -52,6 +56,41 @@ struct PTNTreeBuilder {
     static void Append(PTNSubTree* parent, DWXParseTreeNode* child) { parent->AppendChild(child); }
 };
 
+// Records where the reader built a node.
+struct PTNSourceSetter {
+    static void Set(DWXParseTreeNode* node, const PTNSourceFile* file, int line) {
+        node->poSource = file;
+        node->nSourceLine = line;
+    }
+};
+
+// The reader's entries in a PTNReadLog.
+struct PTNReadLogWriter {
+    static void Add(std::vector<PTNReadReport>& to, int code, int severity, const char* file,
+                    int line, const char* message) {
+        to.push_back(PTNReadReport{code, severity, file, line, message});
+    }
+    static void AddReport(PTNReadLog& log, int code, int severity, const char* file, int line,
+                          const char* message) {
+        Add(log.oReports, code, severity, file, line, message);
+    }
+    static void AddWarning(PTNReadLog& log, int code, const char* file, int line,
+                           const char* message) {
+        Add(log.oWarnings, code, 3, file, line, message);
+    }
+    static size_t ReportCount(const PTNReadLog& log) { return log.oReports.size(); }
+    // Lists `name` unless the file `canonical` is listed already.
+    static void AddFile(PTNReadLog& log, const char* name, const std::string& canonical) {
+        for (const std::string& known : log.oCanonicalFiles) {
+            if (known == canonical) {
+                return;
+            }
+        }
+        log.oCanonicalFiles.push_back(canonical);
+        log.oFiles.push_back(name);
+    }
+};
+
 namespace {
 
 // Nested includes allowed below the file the reading started from.
@@ -61,11 +100,6 @@ struct FreeDeleter {
     void operator()(char* text) const { free(text); }
 };
 using HeapText = std::unique_ptr<char, FreeDeleter>;
-
-struct StreamCloser {
-    void operator()(FILE* stream) const { DKClose(stream); }
-};
-using StreamPtr = std::unique_ptr<FILE, StreamCloser>;
 
 using dwxparse_scan::BeginsWith;
 using dwxparse_scan::ClassOf;
@@ -77,6 +111,42 @@ using dwxparse_scan::ScanInteger;
 
 const char* SourceName(const char* fileName) {
     return fileName ? fileName : "Memory";
+}
+
+std::atomic<bool> gSearchNextToIncluder{false};
+
+// The source records, interned: one per (name, includedBy, includedAtLine),
+// made on first use and kept, like the table itself, for the whole process,
+// since every node read from a file points to its record.
+class SourceTable {
+  public:
+    const PTNSourceFile* Intern(const char* name, const PTNSourceFile* includedBy, int line) {
+        std::string key(name);
+        key.push_back('\0');
+        key.append(reinterpret_cast<const char*>(&includedBy), sizeof includedBy);
+        key.append(reinterpret_cast<const char*>(&line), sizeof line);
+        std::lock_guard<std::mutex> guard(oLock);
+        std::unique_ptr<Record>& record = oRecords[key];
+        if (!record) {
+            record = std::make_unique<Record>();
+            record->name = name;
+            record->file = PTNSourceFile{record->name.c_str(), includedBy, line};
+        }
+        return &record->file;
+    }
+
+  private:
+    struct Record {
+        std::string name;
+        PTNSourceFile file;
+    };
+    std::mutex oLock;
+    std::unordered_map<std::string, std::unique_ptr<Record>> oRecords;
+};
+
+const PTNSourceFile* InternSource(const char* fileName, const PTNSourceFile* includedBy, int line) {
+    static SourceTable* table = new SourceTable;
+    return table->Intern(SourceName(fileName), includedBy, line);
 }
 
 // The type keywords the reader builds nodes for.
@@ -201,24 +271,50 @@ class ChainEntry {
     bool bInclude;
 };
 
-// Reports a corrupt line. The report raises tzn::Exception; the throw below
-// only guards against a reporting service that returns after all.
-[[noreturn]] void ReportCorruptLine(const char* fileName, int line) {
-    const char* text =
-        MkName(_("Corrupt file %s\n at line %d ... missing tokens.\n"), SourceName(fileName), line);
-    std::string message(text);
-    IMPError(-1, 1, message.c_str());
-    throw tzn::Exception(-1, 1, message.c_str());
+// Whether a whole token is a number that atoi reads as written: an
+// optional sign and decimal digits within the range of int.
+bool IsIntegerText(const char* text) {
+    const char* p = text + (*text == '-' || *text == '+');
+    long long value = 0;
+    const char* digits = p;
+    for (; *p >= '0' && *p <= '9'; ++p) {
+        value = value * 10 + (*p - '0');
+        if (value > 2147483648LL) {
+            return false;
+        }
+    }
+    return p != digits && *p == '\0' && (*text == '-' || value <= 2147483647LL);
 }
 
-// The whole content of a stream from its start; the stream is left at its start.
-std::string ReadStream(FILE* stream) {
+// Whether a whole token is a number that atof reads to its end.
+bool IsDoubleText(const char* text) {
+    char* end = nullptr;
+    TZN_strtod(text, &end);
+    return end != text && *end == '\0';
+}
+
+// The whole content of a stream from its start; the stream is left at its
+// start. A read error ends the content at the last complete line before it
+// and stores the system's error number in `error` (EIO when it gave none).
+std::string ReadStream(FILE* stream, int& error) {
     rewind(stream);
     std::string content;
     char chunk[65536];
     size_t got;
-    while ((got = fread(chunk, 1, sizeof chunk, stream)) > 0) {
+    error = 0;
+    for (;;) {
+        errno = 0;
+        got = fread(chunk, 1, sizeof chunk, stream);
         content.append(chunk, got);
+        if (ferror(stream)) {
+            error = errno ? errno : EIO;
+            size_t lineEnd = content.rfind('\n');
+            content.resize(lineEnd == std::string::npos ? 0 : lineEnd + 1);
+            break;
+        }
+        if (got == 0) {
+            break;
+        }
     }
     rewind(stream);
     return content;
@@ -250,23 +346,42 @@ class ListLines {
 // included, so that its scratch buffers are allocated once.
 class TreeReader {
   public:
-    // Reads from `lines` (a ListLines or a TextLineReader) into `root` until
-    // a closing line at the outermost level or the end of the lines. `count`
-    // is the line counter, updated on return. Returns false when an error
-    // inside a nested subtree ended the reading; an error at the outermost
-    // level propagates.
+    // With a log, reports go to it instead of IMPError and warnings are made.
+    explicit TreeReader(PTNReadLog* log) : poLog(log) {}
+
+    // Reads from `lines` (a ListLines or a TextLineReader) of the file
+    // `source` into `root` until a closing line at the outermost level or the
+    // end of the lines. `count` is the line counter, updated on return.
+    // Returns false when an error inside a nested subtree ended the reading;
+    // an error at the outermost level propagates as tzn::Exception.
     template <typename Lines>
-    bool Read(PTNSubTree* root, Lines& lines, const char* fileName, int& count);
+    bool Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* source, int& count);
+
+    // Every report of the reader passes here: to the log when there is one,
+    // else to IMPError. Severity 1 raises tzn::Exception either way.
+    void Report(int code, int severity, const char* fileName, int line, const char* message);
+
+    // Reports a read error that ended the reading of a file after `line`;
+    // the nodes read before it stay in the tree.
+    void ReportReadError(const char* fileName, int line, int error);
 
   private:
+    [[noreturn]] void ReportCorruptLine(const char* fileName, int line);
+    void Warn(int code, const char* fileName, int line, const char* message) {
+        PTNReadLogWriter::AddWarning(*poLog, code, SourceName(fileName), line, message);
+    }
+    // The warnings about a leaf line, which the log alone receives.
+    void CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, const char* fileName, int line);
     // Trims the line of `length` bytes at `line`, cuts a glued ')' and splits
     // it in place, from `first`, its first non-white character. Returns the
     // number of tokens; oTokens holds them, null-terminated.
     size_t Split(char* line, size_t length, char* first);
-    void BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount);
+    DWXParseTreeNode* BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind,
+                                size_t tokenCount);
     void Include(PTNSubTree* target, const char* directive, const char* file, int line,
-                 const char* fileName, bool required);
+                 const PTNSourceFile* source, bool required);
 
+    PTNReadLog* poLog;
     std::vector<char*> oTokens;  // the tokens of the current line, null-terminated
     std::vector<size_t> oLengths;
     std::string oJoined;
@@ -330,8 +445,73 @@ size_t TreeReader::Split(char* line, size_t length, char* first) {
     return count;
 }
 
+void TreeReader::Report(int code, int severity, const char* fileName, int line,
+                        const char* message) {
+    if (!poLog) {
+        IMPError(code, severity, message);
+    } else {
+        PTNReadLogWriter::AddReport(*poLog, code, severity, SourceName(fileName), line, message);
+    }
+    if (severity == 1) {
+        // Also a guard against a reporting service that returns after all.
+        throw tzn::Exception(code, severity, message);
+    }
+}
+
+void TreeReader::ReportReadError(const char* fileName, int line, int error) {
+    std::string reason = std::generic_category().message(error);
+    Report(3, 2, fileName, line,
+           MkName(_("Read error in file '%s'\nafter line %d: %s.\nThe lines before it were "
+                    "kept.\n"),
+                  SourceName(fileName), line, reason.c_str()));
+}
+
+void TreeReader::ReportCorruptLine(const char* fileName, int line) {
+    std::string message(MkName(_("Corrupt file %s\n at line %d ... missing tokens.\n"),
+                               SourceName(fileName), line));
+    Report(-1, 1, fileName, line, message.c_str());
+    throw tzn::Exception(-1, 1, message.c_str());
+}
+
+void TreeReader::CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, const char* fileName,
+                           int line) {
+    const char* value = oTokens[2];
+    switch (kind) {
+        case Keyword::Other:
+            if (!blankName) {
+                Warn(PTNReadLog::kUnknownKeyword, fileName, line,
+                     MkName(_("Type keyword '%s' builds no node; the line is skipped."),
+                            oTokens[1]));
+            }
+            break;
+        case Keyword::Integer:
+            if (!IsIntegerText(value)) {
+                Warn(PTNReadLog::kIntegerText, fileName, line,
+                     MkName(_("Integer value '%s' is not a number that fits in int; read as %d."),
+                            value, ScanInteger(value)));
+            }
+            break;
+        case Keyword::Double:
+            if (!IsDoubleText(value)) {
+                Warn(PTNReadLog::kDoubleText, fileName, line,
+                     MkName(_("Double value '%s' is not a number; read as %s."), value,
+                            MkName(ScanDouble(value), -1)));
+            }
+            break;
+        case Keyword::String:
+            if (tokenCount > 3 && oTokens[3][0] != ')') {
+                Warn(PTNReadLog::kJoinedString, fileName, line,
+                     _("String value of several tokens; they are joined without blanks."));
+            }
+            break;
+        default:
+            break;
+    }
+}
+
 template <typename Lines>
-bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int& count) {
+bool TreeReader::Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* source, int& count) {
+    const char* fileName = source->name;
     // The subtrees opened and not yet closed, each with the count at its
     // opening line: an error inside one ends the reading with that count, as
     // the level that holds it would have kept.
@@ -352,6 +532,10 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
             size_t tokenCount = Split(line, length, first);
             if (tokenCount > 0 && oTokens[0][0] == ')') {
                 if (open.empty()) {
+                    if (poLog) {
+                        Warn(PTNReadLog::kTopLevelClose, fileName, counter,
+                             _("Closing line outside every subtree; the rest is not read."));
+                    }
                     break;
                 }
                 open.pop_back();
@@ -362,19 +546,33 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
             }
             PTNSubTree* current = open.empty() ? root : open.back().first;
             const char* name = oTokens[0] + 1;
+            bool blankName = false;
+            if (poLog && oLengths[0] == 1) {
+                blankName = true;
+                Warn(PTNReadLog::kBlankAfterParen, fileName, counter,
+                     MkName(_("Blank between '(' and the name: the name is empty and '%s' is "
+                              "taken as the type keyword."),
+                            oTokens[1]));
+            }
             bool required = false;
             Keyword kind = Keyword::Other;
             if (IsDirective(name, required)) {
-                Include(current, name, oTokens[1], counter, fileName, required);
+                Include(current, name, oTokens[1], counter, source, required);
             } else if ((kind = Classify(oTokens[1], oLengths[1])) == Keyword::SubTree) {
                 auto subtree = std::make_unique<PTNSubTree>(name);
                 PTNSubTree* raw = subtree.get();
+                PTNSourceSetter::Set(raw, source, counter);
                 PTNTreeBuilder::Append(current, subtree.release());
                 open.emplace_back(raw, counter);
             } else if (tokenCount < 3) {
                 ReportCorruptLine(fileName, counter);
             } else {
-                BuildLeaf(current, name, kind, tokenCount);
+                if (poLog) {
+                    CheckLeaf(kind, tokenCount, blankName, fileName, counter);
+                }
+                if (DWXParseTreeNode* leaf = BuildLeaf(current, name, kind, tokenCount)) {
+                    PTNSourceSetter::Set(leaf, source, counter);
+                }
             }
         } catch (const tzn::Exception&) {
             // Outside every subtree the exception is the caller's; inside
@@ -390,7 +588,9 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const char* fileName, int&
     return true;
 }
 
-void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, size_t tokenCount) {
+// The new leaf, appended to `parent`; null for a keyword it builds nothing for.
+DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind,
+                                        size_t tokenCount) {
     // The value tokens run from the third token up to the first one that
     // begins with ')'.
     size_t valueEnd = 2;
@@ -458,19 +658,27 @@ void TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind, s
             break;
         }
         default:
-            return;  // a keyword the reader builds nothing for
+            return nullptr;  // a keyword the reader builds nothing for
     }
-    PTNTreeBuilder::Append(parent, node.release());
+    DWXParseTreeNode* leaf = node.release();
+    PTNTreeBuilder::Append(parent, leaf);
+    return leaf;
 }
 
 void TreeReader::Include(PTNSubTree* target, const char* directive, const char* file, int line,
-                         const char* fileName, bool required) {
+                         const PTNSourceFile* source, bool required) {
+    const char* fileName = source->name;
     if (tzn::tracer::Debugger::moDebugLevel != 0) {
         tzn::tracer::Debugger::Debug(
             tzn::tracer::Debugger::FormatString("<%s %s>\n", directive, file), 2, "dwxcore",
             "base/dwxcore/dwxparse", 856);
     }
     HeapText path(HStringExpand(file));
+    if (gSearchNextToIncluder.load(std::memory_order_relaxed)) {
+        if (HeapText nearby{IMPFindFileNextTo(fileName, path.get())}) {
+            path = std::move(nearby);
+        }
+    }
     if (!DKCheck(path.get())) {
         HeapText found(IMPFindFile("etc", path.get()));
         if (!found) {
@@ -484,48 +692,80 @@ void TreeReader::Include(PTNSubTree* target, const char* directive, const char* 
     if (DKCheck(path.get())) {
         std::string canonical = CanonicalPath(path.get());
         if (IsOnChain(canonical)) {
-            IMPError(3, 2,
-                     MkName(_("Include cycle: file '%s'\nrequested in %s directive\non line %d of "
-                              "file '%s'\nis already being read.\nIgnoring.\n"),
-                            path.get(), directive, line, SourceName(fileName)));
+            Report(3, 2, fileName, line,
+                   MkName(_("Include cycle: file '%s'\nrequested in %s directive\non line %d of "
+                            "file '%s'\nis already being read.\nIgnoring.\n"),
+                          path.get(), directive, line, SourceName(fileName)));
             return;
         }
         if (tChain.depth >= kMaxIncludeDepth) {
-            IMPError(3, 2,
-                     MkName(_("Include depth limit of %d reached: file '%s'\nrequested in %s "
-                              "directive\non line %d of file '%s'.\nIgnoring.\n"),
-                            kMaxIncludeDepth, path.get(), directive, line, SourceName(fileName)));
+            Report(3, 2, fileName, line,
+                   MkName(_("Include depth limit of %d reached: file '%s'\nrequested in %s "
+                            "directive\non line %d of file '%s'.\nIgnoring.\n"),
+                          kMaxIncludeDepth, path.get(), directive, line, SourceName(fileName)));
             return;
         }
-        // A file that DKCheck accepted but that cannot be opened or read
-        // after all is handled as a missing one.
-        StreamPtr stream(DKOpen(path.get(), 4, "r"));
-        if (stream) {
-            rewind(stream.get());
-            const char* openedName = fp2filename(stream.get());
-            if (!openedName) {
-                openedName = path.get();
+        // The file is opened once, by the line reader, which never waits on
+        // a FIFO put in its place since the check. A file that DKCheck
+        // accepted but that cannot be opened after all is handled as a
+        // missing one.
+        TextLineReader lines;
+        if (lines.OpenFile(path.get())) {
+            if (poLog) {
+                PTNReadLogWriter::AddFile(*poLog, path.get(), canonical);
             }
-            TextLineReader lines;
-            if (lines.OpenFile(openedName)) {
-                ChainEntry entry(std::move(canonical), true);
-                int counter = 0;
-                Read(target, lines, openedName, counter);
-                return;
+            ChainEntry entry(std::move(canonical), true);
+            int counter = 0;
+            if (Read(target, lines, InternSource(path.get(), source, line), counter) &&
+                lines.Failed()) {
+                ReportReadError(path.get(), counter, lines.ErrorNumber());
             }
+            return;
         }
     }
     if (required) {
-        IMPError(3, 2,
-                 MkName(_("Unable to locate file '%s'\nrequested in @include directive\non line "
-                          "%d of file '%s'.\nIgnoring.\n"),
-                        path.get(), line, SourceName(fileName)));
+        Report(3, 2, fileName, line,
+               MkName(_("Unable to locate file '%s'\nrequested in @include directive\non line "
+                        "%d of file '%s'.\nIgnoring.\n"),
+                      path.get(), line, SourceName(fileName)));
+    }
+}
+
+// Runs a whole read. With a log, the exception that ends a read on a corrupt
+// line stays here; its report is in the log already.
+template <typename Lines>
+void ReadAll(PTNSubTree* tree, Lines& lines, const char* fileName, PTNReadLog* log,
+             int streamError) {
+    TreeReader reader(log);
+    int counter = 0;
+    const PTNSourceFile* source = InternSource(fileName, nullptr, 0);
+    size_t reports = log ? PTNReadLogWriter::ReportCount(*log) : 0;
+    try {
+        if (reader.Read(tree, lines, source, counter)) {
+            int error = lines.Failed() ? lines.ErrorNumber() : streamError;
+            if (error != 0) {
+                reader.ReportReadError(fileName, counter, error);
+            }
+        }
+    } catch (const tzn::Exception& error) {
+        if (!log) {
+            throw;
+        }
+        // A read must not end without a report saying why.
+        if (PTNReadLogWriter::ReportCount(*log) == reports) {
+            PTNReadLogWriter::AddReport(*log, error.Code(), error.Severity(), SourceName(fileName),
+                                        counter, error.what());
+        }
     }
 }
 
 }  // namespace
 
 void PTNSubTree::BuildFromFile(FILE* stream) {
+    BuildFromFile(stream, nullptr);
+}
+
+void PTNSubTree::BuildFromFile(FILE* stream, PTNReadLog* log) {
     if (!stream) {
         return;
     }
@@ -533,30 +773,39 @@ void PTNSubTree::BuildFromFile(FILE* stream) {
     const char* name = fp2filename(stream);
     TextLineReader lines;
     std::string content;
+    int streamError = 0;
     if (!name || !lines.OpenFile(name)) {
         // A stream that DKOpen did not open (or whose file went away) is
         // read from its own content.
-        content = ReadStream(stream);
+        content = ReadStream(stream, streamError);
         lines.OpenBuffer(content.c_str());
     }
     std::unique_ptr<ChainEntry> entry;
     if (name) {
-        entry = std::make_unique<ChainEntry>(CanonicalPath(name), false);
+        std::string canonical = CanonicalPath(name);
+        if (log) {
+            PTNReadLogWriter::AddFile(*log, name, canonical);
+        }
+        entry = std::make_unique<ChainEntry>(std::move(canonical), false);
     }
-    TreeReader reader;
-    int counter = 0;
-    reader.Read(this, lines, name, counter);
+    ReadAll(this, lines, name, log, streamError);
 }
 
 void PTNSubTree::BuildFromString(const char* buffer) {
+    BuildFromString(buffer, nullptr);
+}
+
+void PTNSubTree::BuildFromString(const char* buffer, PTNReadLog* log) {
     if (!buffer) {
         return;
     }
     TextLineReader lines;
     lines.OpenBuffer(buffer);
-    TreeReader reader;
-    int counter = 0;
-    reader.Read(this, lines, nullptr, counter);
+    ReadAll(this, lines, nullptr, log, 0);
+}
+
+void PTNSubTree::SetIncludeSearchNextToIncluder(bool on) {
+    gSearchNextToIncluder.store(on, std::memory_order_relaxed);
 }
 
 char** PTNSubTree::AddChildrenFromStringList(char** lines, const char* fileName, int* lineCounter) {
@@ -564,9 +813,9 @@ char** PTNSubTree::AddChildrenFromStringList(char** lines, const char* fileName,
         return nullptr;
     }
     ListLines source(lines);
-    TreeReader reader;
+    TreeReader reader(nullptr);
     int counter = lineCounter ? *lineCounter : 0;
-    bool finished = reader.Read(this, source, fileName, counter);
+    bool finished = reader.Read(this, source, InternSource(fileName, nullptr, 0), counter);
     if (lineCounter) {
         *lineCounter = counter;
     }

@@ -5,10 +5,12 @@
 #include <services/portability.h>
 #include <services/rtprim.h>
 
+#include <limits.h>
 #include <stdint.h>
 #include <stdlib.h>
 #include <string.h>
 
+#include <string>
 #include <typeinfo>
 #include <utility>
 #include <vector>
@@ -493,9 +495,11 @@ void PTNSubTree::CopyChildrenFrom(const PTNSubTree& other) {
                 continue;
             }
             if (IsPlainSubTree(child)) {
+                auto* source = static_cast<const PTNSubTree*>(child);
                 auto* copy = new PTNSubTree(child->GetName());
+                source->KeepSource(copy);
                 work.second->AppendChild(copy);
-                pending.emplace_back(static_cast<const PTNSubTree*>(child), copy);
+                pending.emplace_back(source, copy);
             } else if (DWXParseTreeNode* copy = child->Copy()) {
                 // A host's class may hand back a node that is already placed;
                 // a new one needs none of AddChild's checks.
@@ -685,6 +689,84 @@ int PTNSubTree::GetNumberOfOccurence(const char* name) const {
         }
     }
     return count;
+}
+
+// ---------------------------------------------------------------------------
+// Paths
+
+namespace {
+
+// One step of a path: the name (not terminated; it ends at nameEnd) and the
+// index, or -1 when the step has none. False for a malformed step.
+bool ParseStep(const char* step, const char* stepEnd, const char** nameEnd, int* index) {
+    const char* bracket = static_cast<const char*>(memchr(step, '[', stepEnd - step));
+    *nameEnd = bracket ? bracket : stepEnd;
+    *index = -1;
+    if (*nameEnd == step) {
+        return false;  // an empty name
+    }
+    if (!bracket) {
+        return true;
+    }
+    // "[digits]" and nothing after it; the index must fit in int.
+    const char* digit = bracket + 1;
+    if (stepEnd - digit < 2 || stepEnd[-1] != ']') {
+        return false;
+    }
+    long long value = 0;
+    for (; digit < stepEnd - 1; ++digit) {
+        if (*digit < '0' || *digit > '9') {
+            return false;
+        }
+        value = value * 10 + (*digit - '0');
+        if (value > INT_MAX) {
+            return false;
+        }
+    }
+    *index = static_cast<int>(value);
+    return true;
+}
+
+}  // namespace
+
+DWXParseTreeNode* PTNSubTree::Find(const char* path) const {
+    if (path == nullptr || *path == '\0') {
+        return nullptr;
+    }
+    const PTNSubTree* tree = this;
+    std::string name;
+    for (const char* step = path;;) {
+        const char* stepEnd = strchr(step, '/');
+        if (stepEnd == nullptr) {
+            stepEnd = step + strlen(step);
+        }
+        const char* nameEnd;
+        int index;
+        if (!ParseStep(step, stepEnd, &nameEnd, &index)) {
+            return nullptr;
+        }
+        name.assign(step, nameEnd);
+        DWXParseTreeNode* node = nullptr;
+        if (index <= 0) {
+            node = tree->GetChild(name.c_str());
+        } else if (index < tree->GetNumberOfOccurence(name.c_str())) {
+            // The N-th namesake: one walk of the children.
+            for (DWXParseTreeNode* child : *tree) {
+                if (NameMatches(child, name.c_str()) && index-- == 0) {
+                    node = child;
+                    break;
+                }
+            }
+        }
+        if (node == nullptr || *stepEnd == '\0') {
+            return node;
+        }
+        tree = dynamic_cast<const PTNSubTree*>(node);
+        if (tree == nullptr) {
+            return nullptr;  // a leaf has no children to step into
+        }
+        step = stepEnd + 1;
+    }
 }
 
 // ---------------------------------------------------------------------------

@@ -13,7 +13,13 @@ int PTNSubTree::PTNValidateFile(FILE* stream, const char* name) {
     }
     rewind(stream);
     const char* line = nullptr;
+    bool first = true;
     while (const char* read = DKReadLine(stream)) {
+        // A UTF-8 byte order mark is no part of the first line, as for the reader.
+        if (first && strncmp(read, "\xEF\xBB\xBF", 3) == 0) {
+            read += 3;
+        }
+        first = false;
         if (!IsCommentOrEmptyLine(read)) {
             line = read;
             break;

@@ -224,6 +224,14 @@ DWXString operator+(const char* a, const DWXString& b) {
 
 char& DWXString::operator[](int index) {
     assert(index >= 0 && index <= nLength);
+    if (nCapacity == 0) {
+        // The terminator of an empty string is the read-only chNil: a write
+        // there, such as e[e.GetLength()] = '\0', goes to a scratch byte of
+        // the thread instead, and the string stays empty.
+        thread_local char scratch;
+        scratch = '\0';
+        return scratch;
+    }
     return pchData[index];
 }
 
@@ -375,6 +383,16 @@ void DWXString::FormatV(const char* format, va_list args) {
         vsnprintf(pchData, static_cast<size_t>(n) + 1, OrEmpty(format), args);
         nLength = n;
         free(old);
+        const int length = static_cast<int>(strlen(pchData));
+        if (length < n) {
+            // A %c of 0 ended the text early: keep what comes before it, in
+            // a block sized for that.
+            char* text = pchData;
+            pchData = NilBuffer();
+            nLength = nCapacity = 0;
+            Assign(text, length);
+            free(text);
+        }
         return;
     }
     // The text fits the current block, but an argument may lie in it, so the
@@ -384,7 +402,7 @@ void DWXString::FormatV(const char* format, va_list args) {
                         ? small
                         : static_cast<char*>(HMalloc(static_cast<size_t>(n) + 1));
     vsnprintf(scratch, static_cast<size_t>(n) + 1, OrEmpty(format), args);
-    Assign(scratch, n);
+    Assign(scratch, static_cast<int>(strlen(scratch)));  // up to a NUL from %c
     if (scratch != small) {
         free(scratch);
     }

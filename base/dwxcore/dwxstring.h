@@ -78,8 +78,8 @@ class DWXCORE_API DWXString {
     operator const char*() const { return pchData; }
     char* GetBufferRef() { return pchData; }
 
-    // The index must lie within 0 to the length (checked with assert); writing
-    // into an empty string is not allowed.
+    // The index must lie within 0 to the length (checked with assert). The
+    // terminator of an empty string may be written: the string stays empty.
     char& operator[](int index);
     char operator[](int index) const;
     // The character at `index`; 0 outside 0 to the length.
@@ -118,8 +118,10 @@ class DWXCORE_API DWXString {
     int ToInt() const;
     double ToDouble() const;
 
-    // Replaces the content with the printf-formatted text, of any length.
-    // Arguments may point into this string's own buffer.
+    // Replaces the content with the printf-formatted text, of any length, up
+    // to its first NUL (a %c of 0 ends it). Arguments may point into this
+    // string's own buffer. Formatting is printf's and follows the host's
+    // locale: under a locale with a decimal comma, %f writes a comma.
     void Format(const char* format, ...) DWXSTRING_PRINTF(2, 3);
 
     friend DWXCORE_API DWXString DWXFormat(const char* format, ...) DWXSTRING_PRINTF(1, 2);
@@ -150,5 +152,6 @@ DWXCORE_API DWXString operator+(const DWXString& a, const char* b);
 DWXCORE_API DWXString operator+(char a, const DWXString& b);
 DWXCORE_API DWXString operator+(const char* a, const DWXString& b);
 
-// A new string holding the printf-formatted text, of any length.
+// A new string holding the printf-formatted text, of any length, up to its
+// first NUL. Like Format, it follows the host's locale (%f may write a comma).
 DWXCORE_API DWXString DWXFormat(const char* format, ...) DWXSTRING_PRINTF(1, 2);

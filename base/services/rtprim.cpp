@@ -137,7 +137,14 @@ char* MkName(const char* format, ...) {
 
 char* MkName(double value, int digits) {
     if (digits >= 0) {
-        return MkName("%.*f", digits, value);
+        // "%.*f" with a point whatever the locale: a sign, up to 309 digits
+        // before the point, the point, `digits` after it and the NUL.
+        size_t size = 312 + static_cast<size_t>(digits);
+        char* text = Reserve(TakeSlot(), size);
+        std::to_chars_result result =
+            std::to_chars(text, text + size - 1, value, std::chars_format::fixed, digits);
+        *result.ptr = '\0';
+        return text;
     }
     // Shortest text that reads back to the same double; 32 bytes hold any of them.
     char* text = Reserve(TakeSlot(), 32);

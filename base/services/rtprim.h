@@ -28,8 +28,8 @@ DWXSERVICES_API char* MkName(const char* format, ...)
 #endif
     ;
 // The text of a double. With digits < 0, the shortest text that reads back to
-// the same double with atof; otherwise "%.*f" with that many digits. Same
-// ownership as the formatting MkName.
+// the same double with atof; otherwise "%.*f" with that many digits. Always
+// with a point, whatever the locale. Same ownership as the formatting MkName.
 DWXSERVICES_API char* MkName(double value, int digits);
 
 // The message in the user's language, or the message itself when no catalogue

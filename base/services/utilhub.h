@@ -2,9 +2,9 @@
 // reporting, exit hooks and the preference-format base classes.
 //
 // A string list is a null-terminated array of heap C strings; the array and
-// every entry come from malloc, and DestroyStringList releases both. The
-// array may have spare slots after its terminator, so that appending one
-// entry takes amortised constant time.
+// every entry come from malloc, and DestroyStringList releases both. Nothing
+// past the terminator is ever read, so hosts may build, cut and edit lists
+// themselves.
 #pragma once
 
 #include <services/rtprim.h>
@@ -34,9 +34,11 @@ DWXSERVICES_API void DestroyStringList(char** list);
 // A deep copy; null for a null list. Caller frees with DestroyStringList.
 DWXSERVICES_API char** DuplicateStringList(char* const* list);
 // Appends a copy of `text` (null is taken as "") and returns the list, which
-// may have moved; a null list starts a new one.
+// may have moved; a null list starts a new one. O(n): the end is found anew on
+// every call, so n appends one at a time cost O(n^2); build long lists in one call.
 DWXSERVICES_API char** AddStringToList(char** list, const char* text);
-// Appends copies of every entry of `other` and returns the list, which may have moved.
+// Appends copies of every entry of `other` and returns the list, which may have
+// moved; `other` may be the list itself. O(n + m), one reallocation.
 DWXSERVICES_API char** AddStringList(char** list, char* const* other);
 
 // One entry per line: split at LF, a CR ending a line is dropped, a UTF-8
@@ -59,9 +61,10 @@ class DWXSERVICES_API TextLineReader {
     TextLineReader(const TextLineReader&) = delete;
     TextLineReader& operator=(const TextLineReader&) = delete;
 
-    // Starts on the file at `path`. 0, and no lines, when it is not a regular
-    // file that can be opened for reading. The file stays open until the
-    // reader is destroyed or opened again.
+    // Starts on the file at `path`. 0, and no lines, when it is neither a
+    // regular file that can be opened for reading nor the null device (which
+    // has no lines). The file stays open until the reader is destroyed or
+    // opened again.
     int OpenFile(const char* path);
     // Starts on a NUL-terminated buffer (null has no lines). The buffer is not
     // copied: it must stay unchanged while the reader walks it.
@@ -72,8 +75,12 @@ class DWXSERVICES_API TextLineReader {
     // terminator included, and it is valid until the next call.
     char* Next(size_t* length);
     // Non-zero when reading the file failed; the lines handed out before that
-    // are the ones before the failure.
+    // are the complete lines before the failure (a line the failure cut short
+    // is not handed out).
     int Failed() const { return bFailed ? 1 : 0; }
+    // The system's error number of that failure (EIO when the system gave
+    // none); 0 while reading has not failed.
+    int ErrorNumber() const { return nError; }
 
   private:
     void Close();
@@ -91,12 +98,14 @@ class DWXSERVICES_API TextLineReader {
     bool bEnd;
     bool bFailed;
     bool bNul;  // a NUL byte was read: lines are cut at their first one
+    int nError;
 };
 
 // ---------------------------------------------------------------------------
 // Files and paths
 
-// Non-zero only for a regular file that can be opened for reading.
+// Non-zero only for a regular file that can be opened for reading, or the null
+// device, which reads as an empty file. Never blocks, a FIFO's path included.
 DWXSERVICES_API int DKCheck(const char* path);
 // Opens `path` with fopen mode `how` and remembers the path for fp2filename;
 // null when it cannot be opened. `mode` is kept for compatibility (4 = read).
@@ -119,6 +128,11 @@ DWXSERVICES_API const char* fp2filename(FILE* stream);
 // first directory holding a readable regular file wins. Caller frees with
 // free(); null when not found or for an unknown key.
 DWXSERVICES_API char* IMPFindFile(const char* key, const char* name);
+// The file `name` in the directory of the file `includer`, as a path made of
+// the two, when `name` is relative, `includer` has a directory part and the
+// result is a readable regular file; null otherwise (null arguments
+// included). Caller frees with free().
+DWXSERVICES_API char* IMPFindFileNextTo(const char* includer, const char* name);
 // A heap copy of `text` with $NAME and ${NAME} replaced by the environment
 // variable's value; an unset variable gives an empty text, and a '$' not
 // followed by a name (or "${" without its "}") stays as it is. Null gives

@@ -2,11 +2,17 @@
 // the "etc"/"pro" search and environment expansion.
 #include <services/utilhub.h>
 
-#include <ctype.h>
+#include "utilhub_internal.h"
+
 #include <stdlib.h>
 #include <string.h>
 #include <sys/stat.h>
+#if !defined(_WIN32)
+#include <fcntl.h>
+#include <unistd.h>
+#endif
 
+#include <filesystem>
 #include <mutex>
 #include <string>
 #include <unordered_map>
@@ -31,26 +37,81 @@ StreamTable& Streams() {
     return *table;
 }
 
+// Environment names are ASCII letters, digits and '_', whatever the locale
+// says about other bytes.
 bool IsNameStart(char c) {
-    return isalpha(static_cast<unsigned char>(c)) || c == '_';
+    return (AsciiLower(static_cast<unsigned char>(c)) >= 'a' &&
+            AsciiLower(static_cast<unsigned char>(c)) <= 'z') ||
+           c == '_';
 }
 
 bool IsNameChar(char c) {
-    return isalnum(static_cast<unsigned char>(c)) || c == '_';
+    return IsNameStart(c) || (c >= '0' && c <= '9');
 }
+
+#if !defined(_WIN32)
+// The null device, known by its device number so that another name for it
+// (a link, a bind mount) is the null device too.
+bool IsNullDevice(const struct stat& info) {
+    static const struct NullDevice {
+        bool known;
+        dev_t device;
+        NullDevice() : known(false), device() {
+            struct stat null;
+            if (stat("/dev/null", &null) == 0 && S_ISCHR(null.st_mode)) {
+                known = true;
+                device = null.st_rdev;
+            }
+        }
+    } kNull;
+    return kNull.known && S_ISCHR(info.st_mode) && info.st_rdev == kNull.device;
+}
+
+bool IsReadableKind(const struct stat& info) {
+    return S_ISREG(info.st_mode) || IsNullDevice(info);
+}
+#endif
 
 }  // namespace
 
-int DKCheck(const char* path) {
+FILE* utilhub_internal::OpenReadableFile(const char* path) {
     if (!path || !*path) {
-        return 0;
+        return nullptr;
     }
-    // Checked before opening, so that a FIFO never blocks the open.
+#if defined(_WIN32)
     struct stat info;
     if (stat(path, &info) != 0 || !S_ISREG(info.st_mode)) {
-        return 0;
+        return nullptr;
     }
-    FILE* file = fopen(path, "rb");
+    return fopen(path, "rb");
+#else
+    // Checked before opening, since opening some devices has effects of its
+    // own; checked again on the open descriptor, which a non-blocking open
+    // gets at once even for a FIFO that replaced the file in between.
+    struct stat info;
+    if (stat(path, &info) != 0 || !IsReadableKind(info)) {
+        return nullptr;
+    }
+    int fd = open(path, O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC);
+    if (fd < 0) {
+        return nullptr;
+    }
+    int flags = fcntl(fd, F_GETFL);
+    if (fstat(fd, &info) != 0 || !IsReadableKind(info) || flags < 0 ||
+        fcntl(fd, F_SETFL, flags & ~O_NONBLOCK) != 0) {
+        close(fd);
+        return nullptr;
+    }
+    FILE* file = fdopen(fd, "rb");
+    if (!file) {
+        close(fd);
+    }
+    return file;
+#endif
+}
+
+int DKCheck(const char* path) {
+    FILE* file = utilhub_internal::OpenReadableFile(path);
     if (!file) {
         return 0;
     }
@@ -148,6 +209,19 @@ char* IMPFindFile(const char* key, const char* name) {
         p = *end ? end + 1 : end;
     }
     return nullptr;
+}
+
+char* IMPFindFileNextTo(const char* includer, const char* name) {
+    if (!includer || !name || !*name) {
+        return nullptr;
+    }
+    const std::filesystem::path relative(name);
+    const std::filesystem::path directory = std::filesystem::path(includer).parent_path();
+    if (relative.is_absolute() || relative.has_root_name() || directory.empty()) {
+        return nullptr;
+    }
+    const std::string candidate = (directory / relative).string();
+    return DKCheck(candidate.c_str()) ? HString(candidate.c_str()) : nullptr;
 }
 
 char* HStringExpand(const char* text) {

@@ -3,6 +3,7 @@
 
 #include <stdarg.h>
 #include <stddef.h>
+#include <stdio.h>
 #include <string.h>
 
 #include <string>
@@ -33,6 +34,13 @@ inline const char* LineAt(const char* text, const char* end, size_t* length) {
 inline bool StartsWithBom(const char* text, size_t length) {
     return length >= 3 && memcmp(text, "\xEF\xBB\xBF", 3) == 0;
 }
+
+// Opens `path` for reading when it is a regular file or the null device (an
+// empty file: the usual way to switch an include off); null for anything
+// else. FIFOs, sockets, directories and other devices are refused without
+// being opened, and the open itself never waits for a FIFO's writer, even
+// when the path is swapped for one after the check. Caller closes with fclose.
+FILE* OpenReadableFile(const char* path);
 
 // printf-style formatting of `args` into a string of the right size; an
 // empty text for a null or unusable format.

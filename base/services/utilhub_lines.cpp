@@ -3,9 +3,9 @@
 
 #include "utilhub_internal.h"
 
+#include <errno.h>
 #include <stdlib.h>
 #include <string.h>
-#include <sys/stat.h>
 
 using utilhub_internal::LineAt;
 using utilhub_internal::StartsWithBom;
@@ -29,7 +29,8 @@ TextLineReader::TextLineReader()
       pcTextEnd(nullptr),
       bEnd(true),
       bFailed(false),
-      bNul(false) {}
+      bNul(false),
+      nError(0) {}
 
 TextLineReader::~TextLineReader() {
     Close();
@@ -45,6 +46,7 @@ void TextLineReader::Close() {
     pcText = pcTextEnd = nullptr;
     bEnd = true;
     bFailed = bNul = false;
+    nError = 0;
 }
 
 void TextLineReader::Reserve(size_t size) {
@@ -61,15 +63,7 @@ void TextLineReader::Reserve(size_t size) {
 
 int TextLineReader::OpenFile(const char* path) {
     Close();
-    if (!path) {
-        return 0;
-    }
-    // Checked before opening, so that a FIFO never blocks the open.
-    struct stat info;
-    if (stat(path, &info) != 0 || !S_ISREG(info.st_mode)) {
-        return 0;
-    }
-    poFile = fopen(path, "rb");
+    poFile = utilhub_internal::OpenReadableFile(path);
     if (!poFile) {
         return 0;
     }
@@ -114,10 +108,16 @@ bool TextLineReader::Fill() {
     if (nCapacity - nFilled < kBlockSize / 2) {
         Reserve(nFilled + kBlockSize);  // a line longer than a block
     }
+    errno = 0;
     size_t got = fread(pcBuffer + nFilled, 1, nCapacity - nFilled, poFile);
-    if (got == 0) {
+    // A failed read ends the file; the bytes read before the failure stay.
+    if (ferror(poFile)) {
+        bEnd = bFailed = true;
+        nError = errno ? errno : EIO;
+    } else if (got == 0) {
         bEnd = true;
-        bFailed = ferror(poFile) != 0;
+    }
+    if (got == 0) {
         return false;
     }
     if (!bNul && memchr(pcBuffer + nFilled, '\0', got)) {
@@ -155,7 +155,11 @@ char* TextLineReader::Next(size_t* length) {
             nScanned = nFilled;
             Fill();
         }
-        if (!lineEnd && nBegin == nFilled) {
+        // Bytes after the last line end are a last line without a line
+        // end, unless a read error cut them off: a half line read as a whole
+        // one would give a wrong value.
+        if (!lineEnd && (nBegin == nFilled || bFailed)) {
+            nBegin = nScanned = nFilled;
             return nullptr;
         }
         line = pcBuffer + nBegin;

@@ -3,17 +3,8 @@
 
 #include "utilhub_internal.h"
 
-#include <stdint.h>
 #include <stdlib.h>
 #include <string.h>
-
-#if defined(_WIN32)
-#include <malloc.h>
-#elif defined(__APPLE__)
-#include <malloc/malloc.h>
-#else
-#include <malloc.h>
-#endif
 
 using utilhub_internal::IsWhite;
 using utilhub_internal::LineAt;
@@ -21,59 +12,20 @@ using utilhub_internal::StartsWithBom;
 
 namespace {
 
-// Bytes usable in a block from malloc; 0 where the platform cannot tell.
-size_t UsableSize(void* block) {
-#if defined(_WIN32)
-    return _msize(block);
-#elif defined(__APPLE__)
-    return malloc_size(block);
-#elif defined(__GLIBC__)
-    return malloc_usable_size(block);
-#else
-    (void)block;
-    return 0;
-#endif
-}
-
-// Appending one entry must not rescan the list, yet callers keep only the
-// bare array. A list made here therefore has a power-of-two number of slots
-// (at least count + 2), and its last slot holds a tag that encodes the count
-// together with the array's address. The tag is checked against the
-// terminator before it is trusted; lists made elsewhere simply have no valid
-// tag and are counted once.
-uintptr_t AddressKey(char* const* list) {
-    uint64_t key = static_cast<uint64_t>(reinterpret_cast<uintptr_t>(list));
-    key = (key ^ (key >> 29)) * 0xBF58476D1CE4E5B9ull;
-    return static_cast<uintptr_t>(key ^ 0xA5C3F00DD15EA5E5ull);
-}
-
-// Largest power of two not above `n` (0 for 0).
-size_t FloorPowerOfTwo(size_t n) {
-    size_t power = 1;
-    while (power <= n / 2) {
-        power *= 2;
-    }
-    return n ? power : 0;
-}
-
 // Builds a string list in place; the entries pushed become the list's.
+//
+// A list carries nothing but its entries and terminator: hosts build and edit
+// lists themselves, so the builder never trusts memory past the terminator.
+// Within one call it knows its own capacity and grows by doubling; the spare
+// slots left after the terminator are never read again.
 class ListBuilder {
   public:
     ListBuilder() = default;
 
-    // Continues an existing list (null starts a new one).
+    // Continues an existing list (null starts a new one): O(n) to find its end.
     explicit ListBuilder(char** list) : items(list) {
         if (!list) {
             return;
-        }
-        size_t slots = FloorPowerOfTwo(UsableSize(list) / sizeof(char*));
-        if (slots >= kMinimumSlots) {
-            size_t tagged = reinterpret_cast<uintptr_t>(list[slots - 1]) ^ AddressKey(list);
-            if (tagged <= slots - 2 && !list[tagged] && (tagged == 0 || list[tagged - 1])) {
-                count = tagged;
-                capacity = slots;
-                return;
-            }
         }
         while (list[count]) {
             ++count;
@@ -87,9 +39,16 @@ class ListBuilder {
     size_t Count() const { return count; }
     char* At(size_t index) const { return items[index]; }
 
+    // Room for `more` further entries and the terminator, in one step.
+    void Reserve(size_t more) {
+        if (count + more + 1 > capacity) {
+            Grow(count + more + 1);
+        }
+    }
+
     void Push(char* entry) {
-        if (count + 3 > capacity) {
-            Grow();
+        if (count + 2 > capacity) {
+            Grow(capacity < kMinimumSlots ? kMinimumSlots : capacity * 2);
         }
         items[count++] = entry;
     }
@@ -101,23 +60,19 @@ class ListBuilder {
         Push(entry);
     }
 
-    // Terminates and tags the list and hands it over.
+    // Terminates the list and hands it over.
     char** Finish() {
-        if (count + 2 > capacity) {
-            Grow();
-        }
+        Reserve(0);
         items[count] = nullptr;
-        items[capacity - 1] = reinterpret_cast<char*>(count ^ AddressKey(items));
         return items;
     }
 
   private:
     static constexpr size_t kMinimumSlots = 4;
 
-    void Grow() {
-        size_t slots = kMinimumSlots;
-        while (slots < count + 3) {
-            slots *= 2;
+    void Grow(size_t slots) {
+        if (slots < count + 2) {
+            slots = count + 2;
         }
         items = static_cast<char**>(HRealloc(items, slots * sizeof(char*)));
         capacity = slots;
@@ -226,6 +181,7 @@ char** DuplicateStringList(char* const* list) {
 
 char** AddStringToList(char** list, const char* text) {
     ListBuilder builder(list);
+    builder.Reserve(1);  // exactly one more slot: the allocator often grows in place
     builder.Push(HString(text ? text : ""));
     return builder.Finish();
 }
@@ -235,10 +191,12 @@ char** AddStringList(char** list, char* const* other) {
     if (other && other == list) {
         // Appending a list to itself: copy the entries that were there before.
         size_t count = builder.Count();
+        builder.Reserve(count);
         for (size_t i = 0; i < count; ++i) {
             builder.Push(HString(builder.At(i)));
         }
     } else if (other) {
+        builder.Reserve(static_cast<size_t>(CountStringList(other)));
         for (; *other; ++other) {
             builder.Push(HString(*other));
         }

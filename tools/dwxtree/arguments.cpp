@@ -1,100 +1,142 @@
 #include "arguments.h"
 
-#include <dwxcore/dwxcmdline.h>
 #include <services/portability.h>
+
+#include <string.h>
 
 namespace dwxtree {
 
 namespace {
 
-// The name under which DWXCmdLine files the positional arguments that come
-// before the first option. Options always begin with a hyphen, so it cannot
-// clash with one.
-const char kProgramEntry[] = "dwxtree";
+bool IsSpelling(const char* spellings, const std::string& name) {
+    const char* p = spellings;
+    while (*p) {
+        const char* end = strchr(p, ' ');
+        size_t length = end ? static_cast<size_t>(end - p) : strlen(p);
+        if (length == name.size() && _strnicmp(p, name.c_str(), length) == 0) {
+            return true;
+        }
+        if (!end) {
+            break;
+        }
+        p = end + 1;
+    }
+    return false;
+}
 
-const OptionRule* FindRule(const std::vector<OptionRule>& rules, const char* name) {
+const OptionRule* FindRule(const std::vector<OptionRule>& rules, const std::string& name) {
     for (const OptionRule& rule : rules) {
-        if (_stricmp(rule.name, name) == 0) {
+        if (IsSpelling(rule.spellings, name)) {
             return &rule;
         }
     }
     return nullptr;
 }
 
-std::vector<std::string> ValuesOf(const DWXCmdLine& line, const char* name) {
-    std::vector<std::string> values;
-    int count = line.Count(name);
-    for (int i = 0; i < count; ++i) {
-        values.emplace_back(line.GetString(name, "", i));
-    }
-    return values;
+bool IsOption(const std::string& argument) {
+    return argument.size() > 1 && argument[0] == '-';
 }
 
 }  // namespace
 
-bool OpensOption(const char* argument) {
-    return argument[0] == '-' && argument[1] != '-';
-}
-
 bool Arguments::Parse(int argc, const char* const* argv, const std::vector<OptionRule>& rules,
-                      std::string& error) {
+                      int (*operandLimit)(const std::string& first), std::string& error) {
     oGiven.clear();
-    oPositional.clear();
+    oOperands.clear();
+    error.clear();
+    auto fail = [&error](const std::string& message) {
+        if (error.empty()) {
+            error = message;
+        }
+    };
 
-    std::vector<const char*> vector;
-    vector.push_back(kProgramEntry);
+    bool optionsEnded = false;
     for (int i = 1; i < argc; ++i) {
-        vector.push_back(argv[i]);
-    }
-    DWXCmdLine line(static_cast<int>(vector.size()), vector.data());
-    oPositional = ValuesOf(line, kProgramEntry);
-
-    // DWXCmdLine answers for the first of repeated options only, so a
-    // repetition is refused rather than silently dropped.
-    for (size_t i = 1; i < vector.size(); ++i) {
-        const char* written = vector[i];
-        if (!OpensOption(written)) {
+        std::string argument = argv[i];
+        if (optionsEnded || !IsOption(argument)) {
+            oOperands.push_back(argument);
             continue;
         }
-        const OptionRule* rule = FindRule(rules, written);
+        if (argument == "--") {
+            optionsEnded = true;
+            continue;
+        }
+        // "--name=value" carries its value; a single-hyphen spelling never
+        // does, so "-o=x" is the unknown option "-o=x", not a surprise.
+        std::string name = argument;
+        bool inlineValue = false;
+        std::string value;
+        size_t equals = argument.find('=');
+        if (argument.compare(0, 2, "--") == 0 && equals != std::string::npos) {
+            name = argument.substr(0, equals);
+            value = argument.substr(equals + 1);
+            inlineValue = true;
+        }
+        const OptionRule* rule = FindRule(rules, name);
         if (!rule) {
-            error = std::string("unknown option '") + written + "'";
-            return false;
+            fail("unknown option '" + name + "'");
+            continue;
         }
-        if (Has(rule->name)) {
-            error = std::string("option ") + rule->name + " given more than once";
-            return false;
+        Given* given = Find(rule->key);
+        if (given && !rule->repeatable) {
+            fail("option " + name + " given more than once");
+            continue;
         }
-        std::vector<std::string> values = ValuesOf(line, written);
-        size_t keep = rule->arity < 0 ? values.size() : static_cast<size_t>(rule->arity);
-        if (values.size() < keep || (rule->arity < 0 && values.empty())) {
-            error = std::string("option ") + rule->name + " needs a value";
-            return false;
+        if (!given) {
+            oGiven.push_back(Given{rule->key, name, {}});
+            given = &oGiven.back();
         }
-        oPositional.insert(oPositional.end(), values.begin() + static_cast<long>(keep),
-                           values.end());
-        values.resize(keep);
-        oGiven.push_back(Given{rule->name, std::move(values)});
+        if (rule->takes == Takes::kNothing) {
+            if (inlineValue) {
+                fail("option " + name + " takes no value");
+            }
+            continue;
+        }
+        if (!inlineValue) {
+            if (i + 1 >= argc) {
+                fail("option " + name + " needs a value");
+                continue;
+            }
+            value = argv[++i];
+        }
+        given->values.push_back(value);
+        if (rule->takes != Takes::kValues || oOperands.empty()) {
+            continue;
+        }
+        int limit = operandLimit(oOperands[0]);
+        while (i + 1 < argc && !IsOption(argv[i + 1]) &&
+               static_cast<int>(oOperands.size()) - 1 >= limit) {
+            given->values.push_back(argv[++i]);
+        }
     }
-    return true;
+    return error.empty();
 }
 
-bool Arguments::Has(const char* name) const {
-    for (const Given& given : oGiven) {
-        if (_stricmp(given.name.c_str(), name) == 0) {
-            return true;
+Arguments::Given* Arguments::Find(const char* key) {
+    for (Given& given : oGiven) {
+        if (strcmp(given.key, key) == 0) {
+            return &given;
         }
     }
-    return false;
+    return nullptr;
 }
 
-std::vector<std::string> Arguments::Values(const char* name) const {
-    for (const Given& given : oGiven) {
-        if (_stricmp(given.name.c_str(), name) == 0) {
-            return given.values;
-        }
-    }
-    return {};
+const Arguments::Given* Arguments::Find(const char* key) const {
+    return const_cast<Arguments*>(this)->Find(key);
+}
+
+bool Arguments::Has(const char* key) const {
+    return Find(key) != nullptr;
+}
+
+std::vector<std::string> Arguments::Values(const char* key) const {
+    const Given* given = Find(key);
+    return given ? given->values : std::vector<std::string>();
+}
+
+std::string Arguments::Written(const char* key) const {
+    const Given* given = Find(key);
+    return given ? given->written : std::string();
 }
 
 }  // namespace dwxtree

@@ -1,6 +1,13 @@
-// Command-line handling of dwxtree on top of DWXCmdLine: the library parses
-// the argument vector, this layer knows which options a subcommand accepts
-// and how many values each takes.
+// Command-line handling of dwxtree: options and operands in any order, in
+// the habits of the usual Unix tools.
+//
+// An argument that begins with '-' and is longer than "-" is an option;
+// "-" alone is an operand (standard input or output); "--" ends the options,
+// so every later argument is an operand, whatever its first byte. Options
+// have a single-hyphen and a double-hyphen spelling ("-o", "--output");
+// the double-hyphen one also takes its value after '=' ("--output=x.cfg").
+// Spellings compare ignoring ASCII case. Arguments are kept byte for byte:
+// no character splits or escapes them.
 #pragma once
 
 #include <string>
@@ -8,40 +15,55 @@
 
 namespace dwxtree {
 
-// An option a subcommand accepts. `arity` is the number of values it takes:
-// 0 or 1, or -1 for one or more. Values beyond the arity are positional
-// arguments, so "-o out.cfg base.cfg" gives -o the value out.cfg and leaves
-// base.cfg positional.
+enum class Takes {
+    kNothing,
+    kOneValue,
+    // One value; while every operand of the subcommand is already given,
+    // the plain arguments that follow are further values ("-except a b"
+    // after both files of merge).
+    kValues,
+};
+
+// An option: `key` names it in the program, `spellings` lists the accepted
+// spellings separated by blanks ("-o --output").
 struct OptionRule {
-    const char* name;
-    int arity;
+    const char* key;
+    const char* spellings;
+    Takes takes;
+    bool repeatable;
 };
 
 class Arguments {
   public:
-    // Parses argv[1..argc-1]. Returns false and sets `error` for an unknown
-    // option, an option given twice or an option without its value.
+    // Parses argv[1..argc-1] against `rules`. `operandLimit`, called with
+    // the first operand (the subcommand), gives how many operands may
+    // follow it; it decides when a kValues option goes on taking values.
+    // Returns false and sets `error` for an unknown option, a repeated one
+    // that is not repeatable, or a value missing or given where none is
+    // taken; parsing goes on past the error, so a help option anywhere
+    // still counts.
     bool Parse(int argc, const char* const* argv, const std::vector<OptionRule>& rules,
-               std::string& error);
+               int (*operandLimit)(const std::string& first), std::string& error);
 
-    // The arguments that belong to no option, in command-line order.
-    const std::vector<std::string>& Positional() const { return oPositional; }
-    // Whether the option was given (names compare ignoring ASCII case).
-    bool Has(const char* name) const;
-    // The values the option took; empty when it was not given.
-    std::vector<std::string> Values(const char* name) const;
+    // The arguments that are no option or option value, in order.
+    const std::vector<std::string>& Operands() const { return oOperands; }
+    bool Has(const char* key) const;
+    // The values of every occurrence of the option, in order.
+    std::vector<std::string> Values(const char* key) const;
+    // The spelling under which the option was first given, for messages.
+    std::string Written(const char* key) const;
 
   private:
     struct Given {
-        std::string name;  // the rule's spelling
+        const char* key;
+        std::string written;
         std::vector<std::string> values;
     };
-    std::vector<Given> oGiven;
-    std::vector<std::string> oPositional;
-};
+    Given* Find(const char* key);
+    const Given* Find(const char* key) const;
 
-// True for an argument that opens an option in the library's syntax: a
-// hyphen followed by anything but a second hyphen.
-bool OpensOption(const char* argument);
+    std::vector<Given> oGiven;
+    std::vector<std::string> oOperands;
+};
 
 }  // namespace dwxtree

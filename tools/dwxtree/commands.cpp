@@ -1,5 +1,7 @@
 #include "commands.h"
 
+#include "base64stream.h"
+#include "iofiles.h"
 #include "json.h"
 #include "treefile.h"
 
@@ -8,7 +10,6 @@
 #include <services/utilhub.h>
 
 #include <errno.h>
-#include <limits.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
@@ -21,35 +22,77 @@ namespace dwxtree {
 
 namespace {
 
-// Ends a subcommand: a failed write to standard output is a problem too.
-int Finish(int code) {
-    if (fflush(stdout) != 0 || ferror(stdout)) {
-        Complain(std::string("cannot write standard output: ") + strerror(errno));
+std::string Quote(const std::string& name) {
+    return "'" + name + "'";
+}
+
+// Opens the destination the -o option names (standard output without it).
+bool OpenOutput(const Arguments& args, Output& output) {
+    std::vector<std::string> paths = args.Values("output");
+    std::string path = paths.empty() ? std::string() : paths[0];
+    std::string error;
+    if (!output.Open(path, error)) {
+        Complain("cannot write " + Quote(path) + ": " + error);
+        return false;
+    }
+    return true;
+}
+
+std::string OutputName(const Output& output) {
+    return output.Stream() == stdout ? output.Name() : Quote(output.Name());
+}
+
+// Ends a subcommand that wrote to `output`: a file is replaced only when
+// everything went well; a failed write is a problem too.
+int Finish(int code, Output& output) {
+    bool replacing = output.Replacing();
+    if (code != kExitOk && replacing) {
+        output.Discard();
+        Complain(Quote(output.Name()) + " left unchanged");
+        return code;
+    }
+    std::string error;
+    if (!output.Commit(error)) {
+        Complain("cannot write " + OutputName(output) + ": " + error);
+        if (replacing) {
+            Complain(Quote(output.Name()) + " left unchanged");
+        }
         return kExitData;
     }
     return code;
 }
 
-int DataResult(const TreeFile& file) {
-    return Finish(file.reports > 0 ? kExitData : kExitOk);
+int DataCode(const TreeFile& file) {
+    return file.reports > 0 ? kExitData : kExitOk;
 }
 
 struct Shape {
-    int nodes = 0;
-    int subtrees = 0;
-    int depth = 0;
+    long nodes = 0;
+    long subtrees = 0;
+    long depth = 0;
 };
 
-void Measure(const PTNSubTree& tree, int level, Shape& shape) {
-    DWXIter iter(tree.GetChildren());
-    for (DWXObject* object = iter.Start(); object; object = iter.Next()) {
+// Counts the nodes below `root` with a stack of walks, one per open
+// subtree, so any depth fits in memory rather than on the call stack.
+Shape Measure(const PTNSubTree& root) {
+    Shape shape;
+    std::vector<DWXIter> walks;
+    walks.emplace_back(root.GetChildren());
+    while (!walks.empty()) {
+        DWXObject* object = walks.back().Current();
+        if (!object) {
+            walks.pop_back();
+            continue;
+        }
+        walks.back().Next();
         ++shape.nodes;
-        shape.depth = std::max(shape.depth, level);
+        shape.depth = std::max(shape.depth, static_cast<long>(walks.size()));
         if (auto* subtree = dynamic_cast<PTNSubTree*>(object)) {
             ++shape.subtrees;
-            Measure(*subtree, level + 1, shape);
+            walks.emplace_back(subtree->GetChildren());
         }
     }
+    return shape;
 }
 
 // PATH split at '/'; false for an empty path or an empty name in it.
@@ -69,14 +112,14 @@ bool SplitPath(const std::string& path, std::vector<std::string>& names) {
     }
 }
 
-void PrintValue(DWXParseTreeNode* node) {
+void PrintValue(FILE* stream, DWXParseTreeNode* node) {
     if (auto* subtree = dynamic_cast<PTNSubTree*>(node)) {
-        subtree->WriteToFile(stdout);
+        subtree->WriteToFile(stream);
     } else if (auto* string = dynamic_cast<PTNString*>(node)) {
-        printf("%s\n", string->GetValue() ? string->GetValue() : "");
+        fprintf(stream, "%s\n", string->GetValue() ? string->GetValue() : "");
     } else if (auto* strings = dynamic_cast<PTNStringList*>(node)) {
         for (char** entry = strings->GetValue(); entry && *entry; ++entry) {
-            printf("%s\n", *entry);
+            fprintf(stream, "%s\n", *entry);
         }
     } else {
         // Numbers, Bool, Char, Base64 and the numeric lists: the text the
@@ -90,63 +133,40 @@ void PrintValue(DWXParseTreeNode* node) {
             std::replace(value.begin(), value.end(), ' ', '\n');
         }
         if (!list || !value.empty()) {
-            printf("%s\n", value.c_str());
+            fprintf(stream, "%s\n", value.c_str());
         }
     }
-}
-
-std::string ReadAll(FILE* stream) {
-    std::string content;
-    char chunk[65536];
-    size_t got;
-    while ((got = fread(chunk, 1, sizeof chunk, stream)) > 0) {
-        content.append(chunk, got);
-    }
-    return content;
-}
-
-bool IsBase64Character(unsigned char c) {
-    return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9') || c == '+' ||
-           c == '/';
-}
-
-// Input for the decoder: white space removed, then nothing but alphabet
-// characters followed by at most two '='. The library's decoder stops
-// quietly at the first other byte; the tool refuses such input instead of
-// losing what follows it.
-bool CleanBase64(const std::string& input, std::string& clean, std::string& error) {
-    size_t pads = 0;
-    for (size_t i = 0; i < input.size(); ++i) {
-        auto c = static_cast<unsigned char>(input[i]);
-        if (c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f') {
-            continue;
-        }
-        if (c == '=' && pads < 2) {
-            ++pads;
-        } else if (!IsBase64Character(c) || pads > 0) {
-            char text[80];
-            snprintf(text, sizeof text, "not Base64: byte 0x%02x at offset %zu", c, i);
-            error = text;
-            return false;
-        }
-        clean.push_back(static_cast<char>(c));
-    }
-    // A lone character in the final group carries no whole byte.
-    if ((clean.size() - pads) % 4 == 1) {
-        error = "not Base64: the last group has a single character";
-        return false;
-    }
-    return true;
 }
 
 // Reads the file named by the first operand and prints it with `print`.
 int PrintTreeFile(const Arguments& args, void (*print)(FILE*, const PTNSubTree&)) {
     TreeFile file;
-    if (!ReadTreeFile(args.Positional()[1].c_str(), file)) {
+    if (!ReadTreeFile(args.Operands()[1], file)) {
         return kExitData;
     }
-    print(stdout, *file.root);
-    return DataResult(file);
+    Output output;
+    if (!OpenOutput(args, output)) {
+        return kExitData;
+    }
+    print(output.Stream(), *file.root);
+    return Finish(DataCode(file), output);
+}
+
+// 1 when the first meaningful line of the file opens a subtree `name`.
+bool OpensSubtree(const TreeFile& file, const std::string& path, const std::string& name) {
+    FILE* stream = path == kStandardStream
+                       ? fmemopen(const_cast<char*>(file.text.data()), file.text.size(), "r")
+                       : DKOpen(path.c_str(), 4, "r");
+    if (!stream) {
+        return false;
+    }
+    bool opens = PTNSubTree::PTNValidateFile(stream, name.c_str()) == 1;
+    if (path == kStandardStream) {
+        fclose(stream);
+    } else {
+        DKClose(stream);
+    }
+    return opens;
 }
 
 }  // namespace
@@ -156,36 +176,35 @@ int RunShow(const Arguments& args) {
 }
 
 int RunCheck(const Arguments& args) {
-    const char* path = args.Positional()[1].c_str();
-    bool valid = true;
-    if (args.Has("-name")) {
-        std::string name = args.Values("-name")[0];
-        FILE* stream = DKCheck(path) ? DKOpen(path, 4, "r") : nullptr;
-        if (stream) {
-            valid = PTNSubTree::PTNValidateFile(stream, name.c_str()) == 1;
-            DKClose(stream);
-            if (!valid) {
-                Complain(std::string(path) + ": the first line that is not empty or a comment " +
-                         "does not open a subtree named '" + name + "'");
-            }
-        }
-    }
+    const std::string& path = args.Operands()[1];
     TreeFile file;
     if (!ReadTreeFile(path, file, true)) {
         return kExitData;
     }
-    if (!valid || file.reports > 0) {
-        return Finish(kExitData);
+    bool valid = true;
+    if (args.Has("name")) {
+        std::string name = args.Values("name")[0];
+        valid = OpensSubtree(file, path, name);
+        if (!valid) {
+            Report(file.name, 0, Severity::kError,
+                   "the first line that is not empty or a comment does not open a subtree "
+                   "named " +
+                       Quote(name));
+        }
     }
-    Shape shape;
-    Measure(*file.root, 1, shape);
-    printf("%s: ok, %d nodes, %d subtrees, depth %d, %zu files read\n", path, shape.nodes,
-           shape.subtrees, shape.depth, file.files.size());
-    return Finish(kExitOk);
+    Output output;
+    OpenOutput(args, output);
+    if (!valid || file.reports > 0) {
+        return Finish(kExitData, output);
+    }
+    Shape shape = Measure(*file.root);
+    printf("%s: ok, %ld nodes, %ld subtrees, depth %ld, %zu files read\n", file.name.c_str(),
+           shape.nodes, shape.subtrees, shape.depth, file.files.size());
+    return Finish(kExitOk, output);
 }
 
 int RunGet(const Arguments& args) {
-    const std::string& path = args.Positional()[2];
+    const std::string& path = args.Operands()[2];
     std::vector<std::string> names;
     if (!SplitPath(path, names)) {
         fprintf(stderr, "dwxtree get: PATH '%s' must be names separated by single '/'\n",
@@ -193,7 +212,7 @@ int RunGet(const Arguments& args) {
         return kExitUsage;
     }
     TreeFile file;
-    if (!ReadTreeFile(args.Positional()[1].c_str(), file)) {
+    if (!ReadTreeFile(args.Operands()[1], file)) {
         return kExitData;
     }
     DWXParseTreeNode* node = file.root.get();
@@ -201,26 +220,36 @@ int RunGet(const Arguments& args) {
     for (const std::string& name : names) {
         auto* subtree = dynamic_cast<PTNSubTree*>(node);
         if (!subtree) {
-            Complain(args.Positional()[1] + ": '" + path + "' not found: '" + walked + "' is a " +
-                     TypeKeyword(*node) + ", not a SubTree");
-            return Finish(kExitData);
+            Report(file.name, 0, Severity::kError,
+                   Quote(path) + " not found: " + Quote(walked) + " is a " + TypeKeyword(*node) +
+                       ", not a SubTree");
+            return kExitData;
         }
         node = subtree->GetChild(name.c_str());
         walked += (walked.empty() ? "" : "/") + name;
         if (!node) {
-            Complain(args.Positional()[1] + ": '" + path + "' not found: no '" + walked + "'");
-            return Finish(kExitData);
+            Report(file.name, 0, Severity::kError, Quote(path) + " not found: no " + Quote(walked));
+            return kExitData;
         }
     }
-    PrintValue(node);
-    return DataResult(file);
+    Output output;
+    if (!OpenOutput(args, output)) {
+        return kExitData;
+    }
+    PrintValue(output.Stream(), node);
+    return Finish(DataCode(file), output);
 }
 
 int RunMerge(const Arguments& args) {
+    const std::string& basePath = args.Operands()[1];
+    const std::string& otherPath = args.Operands()[2];
+    if (basePath == kStandardStream && otherPath == kStandardStream) {
+        fprintf(stderr, "dwxtree merge: standard input can be only one of the two files\n");
+        return kExitUsage;
+    }
     TreeFile base;
     TreeFile other;
-    if (!ReadTreeFile(args.Positional()[1].c_str(), base) ||
-        !ReadTreeFile(args.Positional()[2].c_str(), other)) {
+    if (!ReadTreeFile(basePath, base) || !ReadTreeFile(otherPath, other)) {
         return kExitData;
     }
     if (base.reports > 0 || other.reports > 0) {
@@ -228,29 +257,28 @@ int RunMerge(const Arguments& args) {
         Complain("nothing written: the input had problems");
         return kExitData;
     }
+    // Each -except value is one name or a list of names separated by ','
+    // or '|'.
     ExceptionList exceptions;
-    for (const std::string& name : args.Values("-except")) {
-        exceptions.Add(name.c_str());
+    for (const std::string& value : args.Values("except")) {
+        size_t start = 0;
+        while (start <= value.size()) {
+            size_t end = value.find_first_of(",|", start);
+            std::string name = value.substr(start, end == std::string::npos ? end : end - start);
+            if (!name.empty()) {
+                exceptions.Add(name.c_str());
+            }
+            start = end == std::string::npos ? value.size() + 1 : end + 1;
+        }
     }
     base.root->SetFrom(other.root.get(), exceptions);
 
-    if (!args.Has("-o")) {
-        WriteTopLevel(stdout, *base.root);
-        return Finish(kExitOk);
-    }
-    std::string out = args.Values("-o")[0];
-    FILE* stream = fopen(out.c_str(), "w");
-    if (!stream) {
-        Complain("cannot write '" + out + "': " + strerror(errno));
+    Output output;
+    if (!OpenOutput(args, output)) {
         return kExitData;
     }
-    WriteTopLevel(stream, *base.root);
-    bool failed = fflush(stream) != 0 || ferror(stream);
-    if (fclose(stream) != 0 || failed) {
-        Complain("cannot write '" + out + "': " + strerror(errno));
-        return kExitData;
-    }
-    return Finish(kExitOk);
+    WriteTopLevel(output.Stream(), *base.root);
+    return Finish(kExitOk, output);
 }
 
 int RunJson(const Arguments& args) {
@@ -258,44 +286,50 @@ int RunJson(const Arguments& args) {
 }
 
 int RunBase64(const Arguments& args) {
-    bool encode = args.Has("-encode");
-    if (encode == args.Has("-decode")) {
-        fprintf(stderr, "dwxtree base64: give exactly one of -encode and -decode\n");
+    bool encode = args.Has("encode");
+    if (encode == args.Has("decode")) {
+        fprintf(stderr, "dwxtree base64: give exactly one of --encode and --decode\n");
         return kExitUsage;
     }
-    std::string input;
-    std::string source = "standard input";
-    if (args.Positional().size() > 1) {
-        source = args.Positional()[1];
-        FILE* stream = fopen(source.c_str(), "rb");
-        if (!stream) {
-            Complain("cannot read '" + source + "': " + strerror(errno));
+    std::string source = args.Operands().size() > 1 ? args.Operands()[1] : kStandardStream;
+    std::string name = source == kStandardStream ? kStandardInputName : source;
+    FILE* input = stdin;
+    if (source != kStandardStream) {
+        std::string reason = UnreadableReason(source, false);
+        input = reason.empty() ? fopen(source.c_str(), "rb") : nullptr;
+        if (!input) {
+            Report(source, 0, Severity::kError,
+                   "cannot read: " + (reason.empty() ? ErrorText(errno) : reason));
             return kExitData;
         }
-        input = ReadAll(stream);
-        fclose(stream);
-    } else {
-        input = ReadAll(stdin);
     }
-    if (input.size() > UINT_MAX) {
-        Complain(source + ": too large for the codec");
+    Output output;
+    if (!OpenOutput(args, output)) {
+        if (input != stdin) {
+            fclose(input);
+        }
         return kExitData;
     }
-    if (encode) {
-        std::string text = base64_encode(reinterpret_cast<const unsigned char*>(input.data()),
-                                         static_cast<unsigned int>(input.size()));
-        printf("%s\n", text.c_str());
-        return Finish(kExitOk);
-    }
-    std::string clean;
     std::string error;
-    if (!CleanBase64(input, clean, error)) {
-        Complain(source + ": " + error);
-        return kExitData;
+    StreamResult result = encode ? EncodeBase64Stream(input, output.Stream(), error)
+                                 : DecodeBase64Stream(input, output.Stream(), error);
+    if (input != stdin) {
+        fclose(input);
     }
-    std::string bytes = base64_decode(clean);
-    fwrite(bytes.data(), 1, bytes.size(), stdout);
-    return Finish(kExitOk);
+    switch (result) {
+        case StreamResult::kOk:
+            return Finish(kExitOk, output);
+        case StreamResult::kBadInput:
+            Report(name, 0, Severity::kError, error);
+            break;
+        case StreamResult::kReadFailed:
+            Report(name, 0, Severity::kError, "cannot read: " + error);
+            break;
+        case StreamResult::kWriteFailed:
+            Complain("cannot write " + OutputName(output) + ": " + error);
+            break;
+    }
+    return Finish(kExitData, output);
 }
 
 }  // namespace dwxtree

@@ -8,6 +8,9 @@
 #include <math.h>
 #include <stdlib.h>
 
+#include <algorithm>
+#include <vector>
+
 namespace dwxtree {
 
 namespace {
@@ -53,8 +56,13 @@ std::string Quoted(const char* text) {
     return text ? "\"" + JsonEscape(text) + "\"" : std::string("null");
 }
 
-void Indent(FILE* stream, int level) {
-    fprintf(stream, "%*s", 2 * level, "");
+// Two blanks per level up to kDeepestIndent levels; deeper levels keep that
+// indent, so the output of a deep tree grows with its size, not with the
+// square of its depth.
+constexpr size_t kDeepestIndent = 16;
+
+void Indent(FILE* stream, size_t level) {
+    fprintf(stream, "%*s", static_cast<int>(2 * std::min(level, kDeepestIndent)), "");
 }
 
 template <class T, class Format>
@@ -66,38 +74,14 @@ void WriteArray(FILE* stream, const T* values, int count, Format format) {
     fputc(']', stream);
 }
 
-void WriteValue(FILE* stream, DWXParseTreeNode* node, int level);
-
-void WriteObject(FILE* stream, const PTNSubTree& tree, int level) {
-    if (tree.GetChildren()->IsEmpty()) {
-        fputs("{}", stream);
-        return;
-    }
-    fputs("{\n", stream);
-    DWXIter iter(tree.GetChildren());
-    bool first = true;
-    for (DWXObject* object = iter.Start(); object; object = iter.Next()) {
-        auto* node = static_cast<DWXParseTreeNode*>(object);
-        fputs(first ? "" : ",\n", stream);
-        first = false;
-        Indent(stream, level + 1);
-        fprintf(stream, "%s: ", Quoted(node->GetName()).c_str());
-        WriteValue(stream, node, level + 1);
-    }
-    fputc('\n', stream);
-    Indent(stream, level);
-    fputc('}', stream);
-}
-
 std::string IntText(int value) {
     return std::to_string(value);
 }
 
-void WriteValue(FILE* stream, DWXParseTreeNode* node, int level) {
+// A leaf's value; subtrees are written by WriteJson's walk.
+void WriteLeaf(FILE* stream, DWXParseTreeNode* node) {
     int count = 0;
-    if (auto* subtree = dynamic_cast<PTNSubTree*>(node)) {
-        WriteObject(stream, *subtree, level);
-    } else if (auto* flag = dynamic_cast<PTNBool*>(node)) {
+    if (auto* flag = dynamic_cast<PTNBool*>(node)) {
         fputs(flag->GetValue() ? "true" : "false", stream);
     } else if (auto* integer = dynamic_cast<PTNInteger*>(node)) {
         fputs(IntText(integer->GetValue()).c_str(), stream);
@@ -184,7 +168,44 @@ std::string JsonNumber(double value) {
 }
 
 void WriteJson(FILE* stream, const PTNSubTree& root) {
-    WriteObject(stream, root, 0);
+    // One walk per open object, so any depth fits in memory rather than on
+    // the call stack.
+    struct Level {
+        DWXIter walk;
+        bool first;
+    };
+    if (root.GetChildren()->IsEmpty()) {
+        fputs("{}\n", stream);
+        return;
+    }
+    fputs("{\n", stream);
+    std::vector<Level> levels;
+    levels.push_back(Level{DWXIter(root.GetChildren()), true});
+    while (!levels.empty()) {
+        Level& level = levels.back();
+        auto* node = static_cast<DWXParseTreeNode*>(level.walk.Current());
+        if (!node) {
+            levels.pop_back();
+            fputc('\n', stream);
+            Indent(stream, levels.size());
+            fputc('}', stream);
+            continue;
+        }
+        level.walk.Next();
+        fputs(level.first ? "" : ",\n", stream);
+        level.first = false;
+        Indent(stream, levels.size());
+        fprintf(stream, "%s: ", Quoted(node->GetName()).c_str());
+        auto* subtree = dynamic_cast<PTNSubTree*>(node);
+        if (!subtree) {
+            WriteLeaf(stream, node);
+        } else if (subtree->GetChildren()->IsEmpty()) {
+            fputs("{}", stream);
+        } else {
+            fputs("{\n", stream);
+            levels.push_back(Level{DWXIter(subtree->GetChildren()), true});
+        }
+    }
     fputc('\n', stream);
 }
 

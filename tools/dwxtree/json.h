@@ -10,10 +10,10 @@
 namespace dwxtree {
 
 // Writes the children of `root` as one JSON object, indented by two blanks
-// per level: subtrees as objects in child order (a repeated name is written
-// once per occurrence), Integer, Float and Double as numbers (null when not
-// finite), Bool as true or false, Char, String and Base64 as strings (a null
-// String as null), lists as arrays.
+// per level (levels below the 16th keep the 16th's indent): subtrees as objects in child order (a
+// repeated name is written once per occurrence), Integer, Float and Double as numbers (null when
+// not finite), Bool as true or false, Char, String and Base64 as strings (a null String as null),
+// lists as arrays.
 void WriteJson(FILE* stream, const PTNSubTree& root);
 
 // `bytes` as the contents of a JSON string, ASCII only: '"', '\\' and control
