@@ -1,7 +1,9 @@
-// Writing and walking the generated tree: WriteToFile against write_info, and
-// GetChildAsInteger on every subtree against ptree::get<int>. The tree is read
-// once per process, in both formats, from the files that bench/run made
-// (DWXBENCH_DATA names their directory) or from files made here.
+// Writing, walking and merging the generated tree: WriteToFile against
+// write_info, GetChildAsInteger on every subtree against ptree::get<int>, and
+// SetFrom of one such tree into another (compared with the read of one by
+// bench/run). Lookups by name among 100,000 siblings against ptree::find. The
+// tree is read once per process, in both formats, from the files that
+// bench/run made (DWXBENCH_DATA names their directory) or from files made here.
 #include "bench_register.h"
 #include "tree_data.h"
 
@@ -15,7 +17,9 @@
 #include <unistd.h>
 
 #include <memory>
+#include <random>
 #include <string>
+#include <vector>
 
 #if DWXBENCH_HAVE_BOOST
 #include <boost/property_tree/info_parser.hpp>
@@ -102,8 +106,72 @@ void TreeWalkOurs(benchmark::State& state) {
     }
 }
 
+// A second copy of the tree, merged into the first: every leaf finds its
+// namesake and takes its value, so each iteration does the whole merge.
+void TreeMergeOurs(benchmark::State& state) {
+    auto& tree = const_cast<PTNSubTree&>(OurTree());
+    static const std::unique_ptr<PTNSubTree> other(tree.DeepCopy());
+    ExceptionList exceptions;
+    exceptions.Add("label");
+    for (auto _ : state) {
+        tree.SetFrom(other.get(), exceptions);
+    }
+}
+
+// The siblings of the lookup benchmarks, and the names looked up: a fixed
+// random sample of them, the same for both contenders.
+constexpr int kSiblings = 100000;
+constexpr int kLookups = 1024;
+
+std::string SiblingName(int i) {
+    return "key" + std::to_string(i);
+}
+
+const std::vector<std::string>& LookedUp() {
+    static const std::vector<std::string> names = [] {
+        std::mt19937 random(42);
+        std::vector<std::string> sample;
+        for (int i = 0; i < kLookups; ++i) {
+            sample.push_back(SiblingName(static_cast<int>(random() % kSiblings)));
+        }
+        return sample;
+    }();
+    return names;
+}
+
+void LookupOurs(benchmark::State& state) {
+    PTNSubTree tree("siblings");
+    for (int i = 0; i < kSiblings; ++i) {
+        tree.AddChild(new PTNInteger(SiblingName(i).c_str(), i));
+    }
+    const std::vector<std::string>& names = LookedUp();
+    tree.GetChild(names[0].c_str());  // the index is built by the first lookup
+    for (auto _ : state) {
+        long sum = 0;
+        for (const std::string& name : names) {
+            sum += static_cast<PTNInteger*>(tree.GetChild(name.c_str()))->GetValue();
+        }
+        benchmark::DoNotOptimize(sum);
+    }
+}
+
 #if DWXBENCH_HAVE_BOOST
 using boost::property_tree::ptree;
+
+void LookupBoost(benchmark::State& state) {
+    ptree tree;
+    for (int i = 0; i < kSiblings; ++i) {
+        tree.push_back(ptree::value_type(SiblingName(i), ptree(std::to_string(i))));
+    }
+    const std::vector<std::string>& names = LookedUp();
+    for (auto _ : state) {
+        long sum = 0;
+        for (const std::string& name : names) {
+            sum += static_cast<long>(tree.find(name)->second.data().size());
+        }
+        benchmark::DoNotOptimize(sum);
+    }
+}
 
 // The peer's tree; its root holds "config" as its only child.
 const ptree& PeerRoot() {
@@ -142,7 +210,10 @@ void TreeWalkBoost(benchmark::State& state) {
 void RegisterTreeBenchmarks() {
     benchmark::RegisterBenchmark("TreeWrite/ours", TreeWriteOurs)->Unit(benchmark::kMillisecond);
     benchmark::RegisterBenchmark("TreeWalk/ours", TreeWalkOurs)->Unit(benchmark::kMillisecond);
+    benchmark::RegisterBenchmark("TreeMerge/ours", TreeMergeOurs)->Unit(benchmark::kMillisecond);
+    benchmark::RegisterBenchmark("Lookup/ours", LookupOurs)->Unit(benchmark::kMicrosecond);
 #if DWXBENCH_HAVE_BOOST
+    benchmark::RegisterBenchmark("Lookup/boost", LookupBoost)->Unit(benchmark::kMicrosecond);
     benchmark::RegisterBenchmark("TreeWrite/boost", TreeWriteBoost)->Unit(benchmark::kMillisecond);
     benchmark::RegisterBenchmark("TreeWalk/boost", TreeWalkBoost)->Unit(benchmark::kMillisecond);
 #endif

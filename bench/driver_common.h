@@ -1,7 +1,7 @@
 // Measurement for the whole-process read drivers: each driver reads one file
-// once and prints one JSON line with the CPU and wall time of the read and the
-// peak resident size of the whole process, so that memory is compared
-// process against process.
+// once, frees what it read, and prints one JSON line with the CPU and wall
+// time of the read, the CPU time of the free, and the peak resident size of
+// the whole process, so that memory is compared process against process.
 #pragma once
 
 #include <stdio.h>
@@ -31,9 +31,12 @@ inline long PeakKilobytes() {
     return usage.ru_maxrss;  // kilobytes on Linux
 }
 
-// Times one read; `read` returns the number of items it saw (lines or nodes).
-template <typename Read>
-int RunDriver(const char* driver, const char* path, Read read) {
+// Times one read and then the release of what it built. `read` returns the
+// number of items it saw (lines or nodes), or -1 when it failed; `check`
+// runs between the two, untimed (it may print a count to stderr); `release`
+// frees everything the read built.
+template <typename Read, typename Check, typename Release>
+int RunDriver(const char* driver, const char* path, Read read, Check check, Release release) {
     double cpu = CpuSeconds();
     double wall = WallSeconds();
     long items = read(path);
@@ -43,16 +46,20 @@ int RunDriver(const char* driver, const char* path, Read read) {
         fprintf(stderr, "%s: cannot read %s\n", driver, path);
         return 1;
     }
-    printf(
-        "{\"driver\": \"%s\", \"cpu_s\": %.6f, \"wall_s\": %.6f, \"maxrss_kb\": %ld, "
-        "\"items\": %ld}\n",
-        driver, cpu, wall, PeakKilobytes(), items);
     // For profiling the read alone: leave before the checks and teardown.
     const char* quit = getenv("DWXBENCH_EXIT_AFTER_READ");
     if (quit && *quit == '1') {
         fflush(stdout);
         _exit(0);
     }
+    check();
+    double freeCpu = CpuSeconds();
+    release();
+    freeCpu = CpuSeconds() - freeCpu;
+    printf(
+        "{\"driver\": \"%s\", \"cpu_s\": %.6f, \"wall_s\": %.6f, \"free_cpu_s\": %.6f, "
+        "\"maxrss_kb\": %ld, \"items\": %ld}\n",
+        driver, cpu, wall, freeCpu, PeakKilobytes(), items);
     return 0;
 }
 

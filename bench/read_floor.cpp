@@ -9,7 +9,7 @@ int main(int argc, char** argv) {
         fprintf(stderr, "usage: %s FILE\n", argv[0]);
         return 2;
     }
-    return dwxbench::RunDriver("floor", argv[1], [](const char* path) -> long {
+    auto read = [](const char* path) -> long {
         FILE* stream = fopen(path, "r");
         if (!stream) {
             return -1;
@@ -23,5 +23,7 @@ int main(int argc, char** argv) {
         free(line);
         fclose(stream);
         return lines;
-    });
+    };
+    return dwxbench::RunDriver(
+        "floor", argv[1], read, [] {}, [] {});
 }

@@ -1,8 +1,10 @@
-// Reads a tree file with BuildFromFile, as a host does.
+// Reads a tree file with BuildFromFile, as a host does, and deletes it.
 #include "driver_common.h"
 
 #include <dwxcore/dwxparse.h>
 #include <services/utilhub.h>
+
+#include <memory>
 
 namespace {
 
@@ -25,17 +27,19 @@ int main(int argc, char** argv) {
         fprintf(stderr, "usage: %s FILE\n", argv[0]);
         return 2;
     }
-    PTNSubTree root("root");
-    int status = dwxbench::RunDriver("ours", argv[1], [&root](const char* path) -> long {
-        FILE* stream = DKOpen(path, 4, "r");
-        if (!stream) {
-            return -1;
-        }
-        root.BuildFromFile(stream);
-        DKClose(stream);
-        return 1;
-    });
-    // Counted after the measurement: a check that the whole tree was read.
-    fprintf(stderr, "ours: %ld nodes\n", CountNodes(root));
-    return status;
+    auto root = std::make_unique<PTNSubTree>("root");
+    return dwxbench::RunDriver(
+        "ours", argv[1],
+        [&root](const char* path) -> long {
+            FILE* stream = DKOpen(path, 4, "r");
+            if (!stream) {
+                return -1;
+            }
+            root->BuildFromFile(stream);
+            DKClose(stream);
+            return 1;
+        },
+        // A check that the whole tree was read.
+        [&root] { fprintf(stderr, "ours: %ld nodes\n", CountNodes(*root)); },
+        [&root] { root.reset(); });
 }

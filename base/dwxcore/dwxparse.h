@@ -11,8 +11,10 @@
 #include <dwxcore/dwxcore_export.h>
 #include <dwxcore/dwxobject.h>
 
+#include <stddef.h>
 #include <stdio.h>
 
+#include <new>
 #include <string>
 #include <vector>
 
@@ -75,16 +77,33 @@ class PTNReadLog {
 
 // Base of every node: a name owned by the node and a borrowed pointer to the
 // subtree that holds it (null until the node is added to one).
+//
+// Nodes created with new come from the library's node pool: blocks carved
+// from slabs of about 64 KB, each slab handed back to the C heap as soon as
+// the last node in it is deleted, whichever thread deletes it. Reading and
+// deleting a large tree thus costs a few hundred slabs instead of a heap
+// block per node. Deleting a single node with delete always works.
 class DWXCORE_API DWXParseTreeNode : public DWXObject {
   public:
     explicit DWXParseTreeNode(const char* name);
-    // Does not detach the node from its parent; the parent is the owner.
+    // A node that still has a parent takes itself out of that parent's
+    // children first, so deleting a child by hand leaves no dangling pointer.
     ~DWXParseTreeNode() override;
+
+    static void* operator new(size_t size);
+    static void* operator new(size_t size, const std::nothrow_t&) noexcept;
+    static void* operator new(size_t, void* where) noexcept { return where; }
+    static void operator delete(void* block, size_t size) noexcept;
+    static void operator delete(void* block, const std::nothrow_t&) noexcept;
+    static void operator delete(void*, void*) noexcept {}
 
     // Borrowed; valid until SetName or destruction.
     const char* GetName() const { return pcName; }
+    // The parent, if any, keeps its name lookups right.
     void SetName(const char* name);
     // Only records the pointer; it does not add the node to that subtree.
+    // The parent recorded must hold the node or be null: the destructor and
+    // SetName tell it.
     void SetParent(PTNSubTree* parent) { poParent = parent; }
     PTNSubTree* GetParentRef() const { return poParent; }
 
@@ -121,11 +140,16 @@ class DWXCORE_API DWXParseTreeNode : public DWXObject {
     friend struct PTNSourceSetter;  // the reader records where it built a node
 
     // A name this short (its terminator included) is kept in the node
-    // itself, which saves most nodes a heap block of their own; pcName points
-    // at whichever storage holds the name (null for a null name).
+    // itself, which saves most nodes a block of their own; a longer one comes
+    // from the node pool. pcName points at whichever storage holds the name
+    // (null for a null name).
     static constexpr size_t kShortName = 8;
     void InitName(const char* name);
     void FreeName();
+    // SetName without telling the parent.
+    void ReplaceName(const char* name);
+
+    friend class PTNSubTree;
 
     char* pcName;
     PTNSubTree* poParent;
@@ -273,7 +297,14 @@ class DWXCORE_API PTNString : public DWXParseTreeNode {
     // The reader's way to hand over a value it has already allocated.
     friend struct PTNStringAdopter;
 
+    // A value this short (its terminator included) is kept in the node
+    // itself, as short names are; pcValue points at whichever storage holds
+    // the value (null for a null value).
+    static constexpr size_t kShortValue = 16;
+    void FreeValue();
+
     char* pcValue;
+    char acShortValue[kShortValue];
 };
 
 // ---------------------------------------------------------------------------
@@ -444,15 +475,21 @@ class DWXCORE_API ExceptionList {
     void Append(const char* name);
     void Clear();
 
+    // The merge hashes the names once for its whole walk.
+    friend class PTNSubTree;
+
     char** ppcNames;
     int nCount;
     int nCapacity;
 };
 
 // The interior node: an ordered sequence of children of any class, owned and
-// deleted with the subtree. Lookups visit only the direct children, in order,
-// compare whole names ignoring case and take the first match; a null name
-// matches nothing.
+// deleted with the subtree. Lookups compare whole names ignoring case and
+// answer as a walk of the direct children in order would: the first match; a
+// null name matches nothing. A subtree of more than a handful of children
+// keeps a name index, built on the first lookup and kept up to date from then
+// on, so that a lookup by name costs O(1) plus the namesakes it passes, a
+// count O(1), and a merge O(children of both trees).
 class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
   public:
     explicit PTNSubTree(const char* name);
@@ -461,8 +498,10 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     PTNSubTree& operator=(const PTNSubTree& other);
     ~PTNSubTree() override;
 
-    // Appends the node and takes ownership; null is ignored. A node must not
-    // be added twice or to two subtrees.
+    // Appends the node and takes ownership; null is ignored. A node that
+    // another subtree (or this one) holds is moved: taken out there and
+    // appended here. The subtree itself and its ancestors are refused, since
+    // a tree cannot hold itself.
     void AddChild(DWXParseTreeNode* child);
     // Borrowed; for reading and iteration.
     const DWXArray* GetChildren() const { return &oChildren; }
@@ -568,9 +607,40 @@ class DWXCORE_API PTNSubTree : public DWXParseTreeNode {
     static int PTNValidateFile(FILE* stream, const char* name);
 
   private:
-    void CopyChildrenFrom(const PTNSubTree& other);
+    // The children array, which grows from 8 slots rather than DWXArray's
+    // 64: most subtrees hold a few leaves, and a large tree holds many of them.
+    class ChildArray : public DWXArray {
+      public:
+        void Append(DWXObject* child);
+        // Hands the slot buffer (null when empty) and its top to the caller,
+        // who frees it with free(); the array is left empty.
+        DWXObject** TakeSlots(int* top);
+    };
+    struct NameIndex;
+    friend class DWXParseTreeNode;
+    friend struct PTNTreeBuilder;
 
-    DWXArray oChildren;
+    void CopyChildrenFrom(const PTNSubTree& other);
+    // Appends a node that has no parent and is no ancestor (the reader's and
+    // the copy's new nodes).
+    void AppendChild(DWXParseTreeNode* child);
+    // The slot of `child`, or -1 when it is not one of the children.
+    int SlotOf(const DWXParseTreeNode* child) const;
+    // Takes `child` out of the children without deleting it; nothing when it
+    // is not one of them.
+    void ForgetChild(DWXParseTreeNode* child);
+    // The child's name changes to `name`; the index follows.
+    void RenameChild(DWXParseTreeNode* child, const char* name);
+    // The index, built first when the subtree is large enough to want one;
+    // null for a small subtree.
+    NameIndex* Index() const;
+    void DropIndex();
+    // Deletes every descendant and empties the array.
+    void DestroyChildren();
+
+    ChildArray oChildren;
+    // Owned; never shared with a copy. Built lazily by const lookups.
+    mutable NameIndex* poIndex;
 };
 
 // File validation: defined in dwxparse_validate.cpp.

@@ -9,6 +9,7 @@
 #include <string>
 
 #include "dwxparse_numbers.h"
+#include "dwxparse_pool.h"
 #include "dwxparse_token.h"
 
 namespace {
@@ -18,6 +19,16 @@ using namespace dwxparse_detail;
 // Numeric setters take a null text as an empty one.
 const char* TextOrEmpty(const char* text) {
     return text != nullptr ? text : "";
+}
+
+// A copy of a long name from the node pool, next to the node when the node
+// was just made, so that reading a node's name seldom needs another cache line.
+char* PooledName(const char* name, size_t size) {
+    void* copy = dwxparse_pool::Allocate(size);
+    if (copy == nullptr) {
+        throw std::bad_alloc();
+    }
+    return static_cast<char*>(memcpy(copy, name, size));
 }
 
 // A heap copy of the text that a Put function wrote into `buffer`.
@@ -53,9 +64,30 @@ DWXParseTreeNode& DWXParseTreeNode::operator=(const DWXParseTreeNode& other) {
 }
 
 DWXParseTreeNode::~DWXParseTreeNode() {
+    if (poParent != nullptr) {
+        poParent->ForgetChild(this);
+    }
     FreeName();
-    pcName = nullptr;
-    poParent = nullptr;
+}
+
+void* DWXParseTreeNode::operator new(size_t size) {
+    void* block = dwxparse_pool::Allocate(size);
+    if (block == nullptr) {
+        throw std::bad_alloc();
+    }
+    return block;
+}
+
+void* DWXParseTreeNode::operator new(size_t size, const std::nothrow_t&) noexcept {
+    return dwxparse_pool::Allocate(size);
+}
+
+void DWXParseTreeNode::operator delete(void* block, size_t size) noexcept {
+    dwxparse_pool::Release(block, size);
+}
+
+void DWXParseTreeNode::operator delete(void* block, const std::nothrow_t&) noexcept {
+    dwxparse_pool::Release(block, 0);
 }
 
 void DWXParseTreeNode::InitName(const char* name) {
@@ -68,17 +100,25 @@ void DWXParseTreeNode::InitName(const char* name) {
         memcpy(acShortName, name, size);
         pcName = acShortName;
     } else {
-        pcName = HString(name);
+        pcName = PooledName(name, size);
     }
 }
 
 void DWXParseTreeNode::FreeName() {
-    if (pcName != acShortName) {
-        free(pcName);
+    if (pcName != nullptr && pcName != acShortName) {
+        dwxparse_pool::Release(pcName, strlen(pcName) + 1);
     }
 }
 
 void DWXParseTreeNode::SetName(const char* name) {
+    if (poParent != nullptr) {
+        poParent->RenameChild(this, name);
+    } else {
+        ReplaceName(name);
+    }
+}
+
+void DWXParseTreeNode::ReplaceName(const char* name) {
     // Copied first: `name` may be our own name or lie inside it.
     if (name != nullptr && strlen(name) < kShortName) {
         char copy[kShortName];
@@ -87,7 +127,7 @@ void DWXParseTreeNode::SetName(const char* name) {
         InitName(copy);
         return;
     }
-    char* copy = HString(name);
+    char* copy = name != nullptr ? PooledName(name, strlen(name) + 1) : nullptr;
     FreeName();
     pcName = copy;
 }
@@ -241,10 +281,13 @@ void PTNDouble::SetFrom(DWXParseTreeNode* other) {
 // PTNString
 
 PTNString::PTNString(const char* name, const char* value)
-    : DWXParseTreeNode(name), pcValue(HString(value)) {}
+    : DWXParseTreeNode(name), pcValue(nullptr) {
+    SetValue(value);
+}
 
-PTNString::PTNString(const PTNString& other)
-    : DWXParseTreeNode(other), pcValue(HString(other.pcValue)) {}
+PTNString::PTNString(const PTNString& other) : DWXParseTreeNode(other), pcValue(nullptr) {
+    SetValue(other.pcValue);
+}
 
 PTNString& PTNString::operator=(const PTNString& other) {
     if (this != &other) {
@@ -255,12 +298,31 @@ PTNString& PTNString::operator=(const PTNString& other) {
 }
 
 PTNString::~PTNString() {
-    free(pcValue);
+    FreeValue();
+}
+
+void PTNString::FreeValue() {
+    if (pcValue != acShortValue) {
+        free(pcValue);
+    }
+    pcValue = nullptr;
 }
 
 void PTNString::SetValue(const char* value) {
-    char* copy = HString(value);  // copied first: `value` may be our own buffer
-    free(pcValue);
+    // Copied first: `value` may be our own value or lie inside it.
+    if (value != nullptr) {
+        size_t size = strlen(value) + 1;
+        if (size <= kShortValue) {
+            char copy[kShortValue];
+            memcpy(copy, value, size);
+            FreeValue();
+            memcpy(acShortValue, copy, size);
+            pcValue = acShortValue;
+            return;
+        }
+    }
+    char* copy = HString(value);
+    FreeValue();
     pcValue = copy;
 }
 

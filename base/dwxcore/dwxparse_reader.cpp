@@ -35,6 +35,11 @@
 
 // Builds String leaves around values the reader has already allocated.
 struct PTNStringAdopter {
+    // Tokens shorter than this unquote to a value the leaf keeps in itself
+    // (unquoting never lengthens a token; only the expansions of values that
+    // begin with '@', 'M' or '_' may, and those the leaf copies as it needs).
+    static constexpr size_t kInline = PTNString::kShortValue;
+
     // A new leaf that owns `value` (a heap text), which is freed here if the
     // leaf cannot be built.
     static PTNString* Make(const char* name, char* value) {
@@ -43,6 +48,12 @@ struct PTNStringAdopter {
         node->pcValue = owned.release();
         return node;
     }
+};
+
+// Appends the nodes the reader makes: new nodes, without a parent, that need
+// none of AddChild's checks.
+struct PTNTreeBuilder {
+    static void Append(PTNSubTree* parent, DWXParseTreeNode* child) { parent->AppendChild(child); }
 };
 
 // Records where the reader built a node.
@@ -551,7 +562,7 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* sourc
                 auto subtree = std::make_unique<PTNSubTree>(name);
                 PTNSubTree* raw = subtree.get();
                 PTNSourceSetter::Set(raw, source, counter);
-                current->AddChild(subtree.release());
+                PTNTreeBuilder::Append(current, subtree.release());
                 open.emplace_back(raw, counter);
             } else if (tokenCount < 3) {
                 ReportCorruptLine(fileName, counter);
@@ -591,17 +602,21 @@ DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Ke
 
     switch (kind) {
         case Keyword::String: {
-            char* value;
-            if (valueEnd == 3) {
-                value = UnquoteTokenToHeap(third, oLengths[2]);
-            } else {
+            const char* token = third;
+            size_t length = oLengths[2];
+            if (valueEnd != 3) {
                 oJoined.clear();
                 for (size_t i = 2; i < valueEnd; ++i) {
                     oJoined.append(oTokens[i], oLengths[i]);
                 }
-                value = UnquoteTokenToHeap(oJoined.data(), oJoined.size());
+                token = oJoined.c_str();
+                length = oJoined.size();
             }
-            node.reset(PTNStringAdopter::Make(name, value));
+            if (length < PTNStringAdopter::kInline) {
+                node = std::make_unique<PTNString>(name, UnquoteToken(token).c_str());
+            } else {
+                node.reset(PTNStringAdopter::Make(name, UnquoteTokenToHeap(token, length)));
+            }
             break;
         }
         case Keyword::StringList: {
@@ -646,7 +661,7 @@ DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Ke
             return nullptr;  // a keyword the reader builds nothing for
     }
     DWXParseTreeNode* leaf = node.release();
-    parent->AddChild(leaf);
+    PTNTreeBuilder::Append(parent, leaf);
     return leaf;
 }
 
