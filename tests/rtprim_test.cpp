@@ -27,6 +27,26 @@ TEST(RtprimHeap, BlocksAreUsableAndReleasedWithFree) {
     EXPECT_EQ(HString(nullptr), nullptr);
 }
 
+// Prefaulting is a hint: whatever pages it touches, inside the block or
+// shared with its neighbours at either end, keep their bytes.
+TEST(RtprimHeap, PrefaultKeepsEveryByte) {
+    const size_t size = 3 * 65536 + 123;
+    std::vector<unsigned char> pattern(size);
+    std::mt19937 random(7);
+    for (unsigned char& byte : pattern) {
+        byte = static_cast<unsigned char>(random());
+    }
+    unsigned char* block = static_cast<unsigned char*>(HMalloc(size));
+    memcpy(block, pattern.data(), size);
+    const size_t spans[][2] = {{0, size}, {1, 4095}, {4097, 8191}, {17, 0}, {size - 5, 5}};
+    for (const auto& span : spans) {
+        HPrefault(block + span[0], span[1]);
+        ASSERT_EQ(memcmp(block, pattern.data(), size), 0) << span[0] << "+" << span[1];
+    }
+    HPrefault(nullptr, 0);
+    free(block);
+}
+
 TEST(RtprimHeapDeathTest, OverflowingSizeEndsTheProcessWithAMessage) {
     EXPECT_DEATH(HCalloc(SIZE_MAX / 2, 4), "out of memory");
 }

@@ -127,6 +127,37 @@ TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
     }
 }
 
+// The index reads names a word at a time with a tail of up to seven bytes:
+// names of every length that differ in a single byte, wherever it lies, are
+// told apart, and found again whatever the case of their letters.
+TEST(SubTreeIndexTest, NamesOfEveryLengthDifferingInAnyOneByte) {
+    const std::string letters = "abcdefghijklmnopqrstu";
+    PTNSubTree tree("t");
+    std::vector<std::pair<std::string, int>> names;
+    for (int length = 1; length <= 20; ++length) {
+        const std::string name = letters.substr(0, static_cast<size_t>(length));
+        names.emplace_back(name, length * 100);
+        for (int at = 0; at < length; ++at) {
+            std::string changed = name;
+            changed[static_cast<size_t>(at)] = '#';
+            names.emplace_back(changed, length * 100 + at + 1);
+        }
+    }
+    for (const auto& name : names) {
+        tree.AddChild(new PTNInteger(name.first.c_str(), name.second));
+    }
+    for (const auto& name : names) {
+        std::string upper = name.first;
+        for (char& c : upper) {
+            c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
+        }
+        EXPECT_EQ(tree.GetChildAsInteger(name.first.c_str()), name.second) << name.first;
+        EXPECT_EQ(tree.GetChildAsInteger(upper.c_str()), name.second) << upper;
+        EXPECT_EQ(tree.GetNumberOfOccurence(upper.c_str()), 1) << upper;
+    }
+    EXPECT_EQ(tree.GetChild("abcdefgh$"), nullptr);
+}
+
 TEST(SubTreeIndexTest, MovedAndDeletedNodesLeaveNoDanglingPointers) {
     auto* source = new PTNSubTree("source");
     PTNSubTree target("target");

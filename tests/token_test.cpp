@@ -66,6 +66,25 @@ TEST(TokenTest, UnquotingUndoesEscapesAndDropsQuoteMarks) {
     }
 }
 
+// The reader keeps short values in the leaf and unquotes them there; values
+// of every length around that size, with escapes that make the token longer
+// than its value, come back as they were written.
+TEST(TokenTest, ReaderReadsBackValuesOfEveryLengthAroundTheInlineSize) {
+    const char* const kFills[] = {"abcdefghijklmnopqrstuvwxyz", "a\"b\\c\nd e",
+                                  "@\"\"\"\"\"\"\"\"\"\"\"\"\""};
+    for (const char* fill : kFills) {
+        for (size_t length = 0; length <= 24; ++length) {
+            std::string value;
+            for (size_t i = 0; i < length; ++i) {
+                value += fill[i % strlen(fill)];
+            }
+            PTNSubTree tree("t");
+            tree.BuildFromString(("(s String " + Quote(value.c_str()) + ")").c_str());
+            EXPECT_EQ(tree.GetChildAsString("s"), value) << fill << " " << length;
+        }
+    }
+}
+
 TEST(TokenTest, ReadingExpandsTranslationsAndListForms) {
     RTMessageCatalogue previous = RTSetMessageCatalogue(Catalogue);
     const Case cases[] = {

@@ -12,6 +12,8 @@
 // operation; giving back takes one.
 #include "dwxparse_pool.h"
 
+#include <services/rtprim.h>
+
 #include <stdint.h>
 #include <stdlib.h>
 
@@ -103,10 +105,18 @@ void Close(Slab* slab) {
     }
 }
 
-Slab* OpenSlab() {
+// `prefault` asks for the slab's pages in one call: a thread that has filled
+// a slab is building a large tree and will fill this one too, and one call
+// costs less than the sixteen page faults it replaces (on the bench tree, a
+// read of 78 ms took 72 ms with it). A thread's first slab is left to fault
+// page by page, so a host that makes a few nodes holds no more than it writes.
+Slab* OpenSlab(bool prefault) {
     void* memory = malloc(kSlabBytes);
     if (memory == nullptr) {
         return nullptr;
+    }
+    if (prefault) {
+        HPrefault(memory, kSlabBytes);
     }
     Slab* slab = new (memory) Slab;
     slab->nLive.store(kOpen, std::memory_order_relaxed);
@@ -167,7 +177,7 @@ void* Allocate(size_t size) noexcept {
     const size_t step = (size + kWord + kAlign - 1) & ~(kAlign - 1);
     Slab* slab = carver.poSlab;
     if (slab == nullptr || static_cast<size_t>(slab->pcEnd - slab->pcNext) < step) {
-        Slab* fresh = OpenSlab();
+        Slab* fresh = OpenSlab(slab != nullptr);
         if (fresh == nullptr) {
             return nullptr;
         }

@@ -19,6 +19,12 @@ std::string UnquoteToken(const char* token);
 // caller frees with free(); the reader hands it to its String leaf as it is.
 char* UnquoteTokenToHeap(const char* token, size_t length);
 
+// The value of `token` as UnquoteToken gives it, written with its terminator
+// at `out` (room for the token's bytes and one more) without a string on the
+// way; returns the terminator's position. Null for a value that an expansion
+// may change, which UnquoteToken must read; `out` then holds nothing useful.
+char* UnquoteTokenInto(const char* token, char* out);
+
 // Rewrites MkTokenString(a,b,...) as a|b|..., dropping the items from the
 // first NULL item on; a value without the keyword gets ExpandTranslationCall.
 void ExpandMkTokenString(std::string& value);

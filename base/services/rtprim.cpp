@@ -2,9 +2,14 @@
 
 #include <locale.h>
 #include <stdarg.h>
+#include <stdint.h>
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
+#if defined(__linux__)
+#include <sys/mman.h>
+#include <unistd.h>
+#endif
 #include <atomic>
 #include <charconv>
 
@@ -95,6 +100,24 @@ void* HRealloc(void* block, size_t size) {
         OutOfMemory(size);
     }
     return moved;
+}
+
+void HPrefault(void* block, size_t size) {
+#if defined(__linux__) && defined(MADV_POPULATE_WRITE)
+    // Whole pages only: madvise wants a page-aligned start, and the pages at
+    // either end, shared with other blocks, fault in as usual.
+    static const uintptr_t kPage = static_cast<uintptr_t>(sysconf(_SC_PAGESIZE));
+    const uintptr_t start = (reinterpret_cast<uintptr_t>(block) + kPage - 1) & ~(kPage - 1);
+    const uintptr_t end = (reinterpret_cast<uintptr_t>(block) + size) & ~(kPage - 1);
+    if (end > start) {
+        // A kernel without the call (before Linux 5.14) says EINVAL; the
+        // pages are then faulted in as they are written, as without it.
+        (void)madvise(reinterpret_cast<void*>(start), end - start, MADV_POPULATE_WRITE);
+    }
+#else
+    (void)block;
+    (void)size;
+#endif
 }
 
 char* HString(const char* text) {

@@ -17,6 +17,11 @@ DWXSERVICES_API void* HMalloc(size_t size);
 DWXSERVICES_API void* HCalloc(size_t a, size_t b);
 // Resizes `block` (null allocates), keeping its contents; continue with the result.
 DWXSERVICES_API void* HRealloc(void* block, size_t size);
+// Asks the system to back the whole pages inside the block with memory now,
+// in one call, instead of in one page fault per page as they are first
+// written. Only a hint: the contents and every other effect stay as they
+// are, and it does nothing where the system has no such call.
+DWXSERVICES_API void HPrefault(void* block, size_t size);
 // A heap copy of `text`; null for a null `text`. Caller frees with free().
 DWXSERVICES_API char* HString(const char* text);
 
