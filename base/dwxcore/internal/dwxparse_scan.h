@@ -10,7 +10,7 @@
 #include <stdlib.h>
 #include <string.h>
 
-namespace dwxparse_scan {
+namespace dwxcore::internal {
 
 // What a byte means to the tokenizer: white space is the set that Tokenize
 // splits at (space, tab, LF, VT, FF, CR); a double quote opens or closes a
@@ -161,4 +161,4 @@ inline double ScanDouble(const char* text) {
     return fraction ? value / kPowersOfTen[fraction] : value;
 }
 
-}  // namespace dwxparse_scan
+}  // namespace dwxcore::internal

@@ -5,7 +5,7 @@
 
 #include <stddef.h>
 
-namespace dwxcore_detail {
+namespace dwxcore::internal {
 
 // Clears every entry of items[0, count) that repeats an earlier non-null
 // entry, so that a pointer held in several places is deleted once; returns
@@ -18,4 +18,4 @@ size_t ClearRepeats(DWXObject** items, size_t count);
 // as that destructor left it. O(n).
 void DestroyListContents(DWXLinkedList& list);
 
-}  // namespace dwxcore_detail
+}  // namespace dwxcore::internal

@@ -3,10 +3,10 @@
 
 #include <stddef.h>
 
-namespace dwxcore_detail {
+namespace dwxcore::internal {
 
 // Sorts `count` elements of `size` bytes at `base` with the contract of qsort.
 // Equal elements are never exchanged, but their order is not kept.
 void QuickSort(void* base, size_t count, size_t size, int (*compare)(const void*, const void*));
 
-}  // namespace dwxcore_detail
+}  // namespace dwxcore::internal

@@ -4,7 +4,7 @@
 
 #include <stddef.h>
 
-namespace dwxparse_pool {
+namespace dwxcore::internal {
 
 // A block of at least `size` bytes, aligned to 16; null when memory is out.
 void* Allocate(size_t size) noexcept;
@@ -14,4 +14,4 @@ void* Allocate(size_t size) noexcept;
 // that another thread allocated.
 void Release(void* block, size_t size) noexcept;
 
-}  // namespace dwxparse_pool
+}  // namespace dwxcore::internal

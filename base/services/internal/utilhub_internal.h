@@ -8,7 +8,7 @@
 
 #include <string>
 
-namespace utilhub_internal {
+namespace dwxservices::internal {
 
 // The white-space set of the utility layer: space, tab, LF, VT, FF, CR.
 inline bool IsWhite(unsigned char c) {
@@ -46,4 +46,4 @@ FILE* OpenReadableFile(const char* path);
 // empty text for a null or unusable format.
 std::string FormatV(const char* format, va_list args);
 
-}  // namespace utilhub_internal
+}  // namespace dwxservices::internal

@@ -6,6 +6,8 @@
 
 #include <string>
 
+namespace dwxcore::internal {
+
 // The token for `value`: between double quotes, with '"', line feed and
 // backslash written as \q, \n and \\. A null value gives \q\q without quotes.
 // Caller frees with free().
@@ -32,3 +34,5 @@ void ExpandMkTokenString(std::string& value);
 // Replaces a value of the form _(message), white space around it allowed, by
 // the translation of the message.
 void ExpandTranslationCall(std::string& value);
+
+}  // namespace dwxcore::internal

@@ -7,7 +7,7 @@
 
 #include <charconv>
 
-namespace dwxparse_detail {
+namespace dwxcore::internal {
 
 // Room for every text below: "%f" of the largest double has 309 digits
 // before the point, six after it, the point and a sign.
@@ -43,4 +43,4 @@ inline const char* BoolText(int value) {
     return value != 0 ? "TRUE" : "FALSE";
 }
 
-}  // namespace dwxparse_detail
+}  // namespace dwxcore::internal

@@ -3,7 +3,7 @@
 
 #include <services/rtprim.h>
 
-namespace dwxcolor_detail {
+namespace dwxcore::internal {
 
 // The low 8 bits of the leading decimal number of `text`, read as atoi reads it
 // (white space, sign, digits; 0 without digits), but defined for numbers beyond
@@ -12,4 +12,4 @@ inline int ComponentOf(const char* text) {
     return static_cast<unsigned char>(TZN_strtoll(text, nullptr, 10));
 }
 
-}  // namespace dwxcolor_detail
+}  // namespace dwxcore::internal
