@@ -1,14 +1,19 @@
 // The token syntax of string values: quoting then unquoting gives the value
 // back unless reading expands it on purpose, a written token holds no quote
 // mark but its own two and no line feed, and unquoting any token is safe.
-#include "dwxparse_token.h"
 #include "fuzz_expand.h"
 #include "fuzz_input.h"
+#include "internal/dwxparse_token.h"
 
 #include <stdlib.h>
 #include <string.h>
 
 #include <string>
+
+using dwxcore::internal::ExpandMkTokenString;
+using dwxcore::internal::ExpandTranslationCall;
+using dwxcore::internal::QuoteToken;
+using dwxcore::internal::UnquoteToken;
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     FuzzInput input(data, size);

@@ -59,8 +59,8 @@ void OnSmallStack(const std::function<void()>& work) {
     pthread_attr_init(&attributes);
     pthread_attr_setstacksize(&attributes, 256 * 1024);
     pthread_t thread;
-    auto run = [](void* work) -> void* {
-        (*static_cast<const std::function<void()>*>(work))();
+    auto run = [](void* argument) -> void* {
+        (*static_cast<const std::function<void()>*>(argument))();
         return nullptr;
     };
     ASSERT_EQ(pthread_create(&thread, &attributes, run, const_cast<std::function<void()>*>(&work)),

@@ -403,14 +403,14 @@ struct FailingSource {
 FILE* OpenFailing(FailingSource& source) {
     cookie_io_functions_t io = {};
     io.read = [](void* cookie, char* buffer, size_t size) -> ssize_t {
-        auto* source = static_cast<FailingSource*>(cookie);
-        if (source->position >= source->failAt) {
+        auto* failing = static_cast<FailingSource*>(cookie);
+        if (failing->position >= failing->failAt) {
             errno = EIO;
             return -1;
         }
-        size_t count = std::min(size, source->failAt - source->position);
-        memcpy(buffer, source->text.data() + source->position, count);
-        source->position += count;
+        size_t count = std::min(size, failing->failAt - failing->position);
+        memcpy(buffer, failing->text.data() + failing->position, count);
+        failing->position += count;
         return static_cast<ssize_t>(count);
     };
     return fopencookie(&source, "r", io);

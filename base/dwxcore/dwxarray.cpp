@@ -1,8 +1,8 @@
 #include <dwxcore/dwxobject.h>
 
-#include "dwxcontainer_internal.h"
+#include "internal/dwxcontainer_internal.h"
 
-#include "dwxquicksort.h"
+#include "internal/dwxquicksort.h"
 
 #include <services/rtprim.h>
 
@@ -149,7 +149,8 @@ void DWXArray::DestroyContents() {
     // members, and whatever it leaves is what the walk goes on with. A walk
     // that passes the top starts again from slot 0 while members remain, for
     // those a destructor placed below it. O(n) without repeated pointers.
-    nCount -= static_cast<int>(dwxcore_detail::ClearRepeats(ppoItems, static_cast<size_t>(nTop)));
+    nCount -=
+        static_cast<int>(dwxcore::internal::ClearRepeats(ppoItems, static_cast<size_t>(nTop)));
     int slot = 0;
     while (nCount > 0) {
         if (slot >= nTop) {
@@ -271,7 +272,7 @@ void DWXArray::Sort(int (*compare)(const void*, const void*)) {
     if (!compare) {
         return;
     }
-    dwxcore_detail::QuickSort(ppoItems, nCount, sizeof(DWXObject*), compare);
+    dwxcore::internal::QuickSort(ppoItems, nCount, sizeof(DWXObject*), compare);
 }
 
 void DWXArray::StandartSort(int (*compare)(const void*, const void*)) {

@@ -1,6 +1,6 @@
 #include <dwxcore/dwxobject.h>
 
-#include "dwxcontainer_internal.h"
+#include "internal/dwxcontainer_internal.h"
 
 #include <services/rtprim.h>
 
@@ -121,7 +121,7 @@ void DWXBag::DestroyInOrder() {
     while (walked < nCount && ppoItems[walked]) {
         ++walked;
     }
-    int repeats = static_cast<int>(dwxcore_detail::ClearRepeats(ppoItems, walked));
+    int repeats = static_cast<int>(dwxcore::internal::ClearRepeats(ppoItems, walked));
     if (repeats > 0) {
         int kept = 0;
         for (int i = 0; i < walked; ++i) {

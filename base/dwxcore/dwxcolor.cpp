@@ -1,6 +1,6 @@
 #include <dwxcore/dwxcolor.h>
 
-#include "dwxcolor_scan.h"
+#include "internal/dwxcolor_scan.h"
 
 #include <services/rtprim.h>
 #include <services/utilhub.h>
@@ -122,7 +122,7 @@ void EnsureRegistry() {
 
 }  // namespace
 
-using dwxcolor_detail::ComponentOf;
+using dwxcore::internal::ComponentOf;
 
 DWXColor::DWXColor() : nAlpha(0), nRed(0), nGreen(0), nBlue(0) {}
 

@@ -1,6 +1,6 @@
 #include <dwxcore/dwxcolorpref.h>
 
-#include "dwxcolor_scan.h"
+#include "internal/dwxcolor_scan.h"
 
 #include <services/rtprim.h>
 #include <services/utilhub.h>
@@ -14,7 +14,7 @@ template class PreferenceFormat<DWXColor*>;
 
 namespace {
 
-using dwxcolor_detail::ComponentOf;
+using dwxcore::internal::ComponentOf;
 
 DWXColor* CopyOf(const DWXColor* color) {
     return color != nullptr ? new DWXColor(*color) : nullptr;

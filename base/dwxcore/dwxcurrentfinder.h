@@ -9,7 +9,7 @@
 #include <map>
 #include <string>
 
-namespace dwxcore_detail {
+namespace dwxcore::internal {
 
 // Orders names byte-wise ignoring ASCII case, so "Doc" and "doc" are one name.
 struct NameLessIgnoringCase {
@@ -18,7 +18,7 @@ struct NameLessIgnoringCase {
     }
 };
 
-}  // namespace dwxcore_detail
+}  // namespace dwxcore::internal
 
 // A table of named object pointers that owns the objects recorded in it:
 // destroying the table deletes each of them exactly once, also when one object
@@ -47,7 +47,7 @@ class CurrentFinder {
     T* ReleaseCurrent(const char* name);
 
   protected:
-    std::map<std::string, T*, dwxcore_detail::NameLessIgnoringCase> moObjects;
+    std::map<std::string, T*, dwxcore::internal::NameLessIgnoringCase> moObjects;
 };
 
 extern template class DWXCORE_API CurrentFinder<DWXObject>;

@@ -1,6 +1,6 @@
 #include <dwxcore/dwxobject.h>
 
-#include "dwxcontainer_internal.h"
+#include "internal/dwxcontainer_internal.h"
 
 #include <vector>
 
@@ -153,7 +153,7 @@ void DWXLinkedList::Remove(DWXListNode* node) {
     --nCount;
 }
 
-namespace dwxcore_detail {
+namespace dwxcore::internal {
 
 void DestroyListContents(DWXLinkedList& list) {
     // A walk ends at the first null member: only the nodes before it count,
@@ -184,4 +184,4 @@ void DestroyListContents(DWXLinkedList& list) {
     list.Empty();
 }
 
-}  // namespace dwxcore_detail
+}  // namespace dwxcore::internal

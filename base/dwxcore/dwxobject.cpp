@@ -1,6 +1,6 @@
 #include <dwxcore/dwxobject.h>
 
-#include "dwxcontainer_internal.h"
+#include "internal/dwxcontainer_internal.h"
 
 #include <algorithm>
 #include <unordered_set>
@@ -103,7 +103,7 @@ void DWXContainer::DestroyContents() {
         return;
     }
     if (DWXLinkedList* list = dynamic_cast<DWXLinkedList*>(this)) {
-        dwxcore_detail::DestroyListContents(*list);
+        dwxcore::internal::DestroyListContents(*list);
         return;
     }
     // A host's container: take the first member out wherever it is held,
@@ -114,7 +114,7 @@ void DWXContainer::DestroyContents() {
             // A Remove that refuses what Start yields: delete what the walk
             // still meets, each pointer once.
             std::vector<DWXObject*> rest = Snapshot(this);
-            dwxcore_detail::ClearRepeats(rest.data(), rest.size());
+            dwxcore::internal::ClearRepeats(rest.data(), rest.size());
             for (DWXObject* other : rest) {
                 delete other;
             }
@@ -184,7 +184,7 @@ void DWXIter::SetTarget(const DWXContainer* container) {
 
 DWXValidatable::~DWXValidatable() {}
 
-namespace dwxcore_detail {
+namespace dwxcore::internal {
 
 size_t ClearRepeats(DWXObject** items, size_t count) {
     // Repeats are rare (AddContainer of a container into itself), so look for
@@ -219,4 +219,4 @@ size_t ClearRepeats(DWXObject** items, size_t count) {
     return cleared;
 }
 
-}  // namespace dwxcore_detail
+}  // namespace dwxcore::internal

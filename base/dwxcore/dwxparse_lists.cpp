@@ -11,12 +11,12 @@
 
 #include <string>
 
-#include "dwxparse_numbers.h"
-#include "dwxparse_token.h"
+#include "internal/dwxparse_numbers.h"
+#include "internal/dwxparse_token.h"
 
 namespace {
 
-using namespace dwxparse_detail;
+using namespace dwxcore::internal;
 
 // A new heap copy of `count` elements, or null for an empty list (a count
 // below 1 or no source array).

@@ -8,13 +8,13 @@
 
 #include <string>
 
-#include "dwxparse_numbers.h"
-#include "dwxparse_pool.h"
-#include "dwxparse_token.h"
+#include "internal/dwxparse_numbers.h"
+#include "internal/dwxparse_pool.h"
+#include "internal/dwxparse_token.h"
 
 namespace {
 
-using namespace dwxparse_detail;
+using namespace dwxcore::internal;
 
 // Numeric setters take a null text as an empty one.
 const char* TextOrEmpty(const char* text) {
@@ -24,7 +24,7 @@ const char* TextOrEmpty(const char* text) {
 // A copy of a long name from the node pool, next to the node when the node
 // was just made, so that reading a node's name seldom needs another cache line.
 char* PooledName(const char* name, size_t size) {
-    void* copy = dwxparse_pool::Allocate(size);
+    void* copy = dwxcore::internal::Allocate(size);
     if (copy == nullptr) {
         throw std::bad_alloc();
     }
@@ -71,7 +71,7 @@ DWXParseTreeNode::~DWXParseTreeNode() {
 }
 
 void* DWXParseTreeNode::operator new(size_t size) {
-    void* block = dwxparse_pool::Allocate(size);
+    void* block = dwxcore::internal::Allocate(size);
     if (block == nullptr) {
         throw std::bad_alloc();
     }
@@ -79,15 +79,15 @@ void* DWXParseTreeNode::operator new(size_t size) {
 }
 
 void* DWXParseTreeNode::operator new(size_t size, const std::nothrow_t&) noexcept {
-    return dwxparse_pool::Allocate(size);
+    return dwxcore::internal::Allocate(size);
 }
 
 void DWXParseTreeNode::operator delete(void* block, size_t size) noexcept {
-    dwxparse_pool::Release(block, size);
+    dwxcore::internal::Release(block, size);
 }
 
 void DWXParseTreeNode::operator delete(void* block, const std::nothrow_t&) noexcept {
-    dwxparse_pool::Release(block, 0);
+    dwxcore::internal::Release(block, 0);
 }
 
 void DWXParseTreeNode::InitName(const char* name) {
@@ -106,7 +106,7 @@ void DWXParseTreeNode::InitName(const char* name) {
 
 void DWXParseTreeNode::FreeName() {
     if (pcName != nullptr && pcName != acShortName) {
-        dwxparse_pool::Release(pcName, strlen(pcName) + 1);
+        dwxcore::internal::Release(pcName, strlen(pcName) + 1);
     }
 }
 

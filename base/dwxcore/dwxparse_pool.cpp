@@ -10,7 +10,7 @@
 // slab, so a slab lives exactly as long as its longest-lived node, and memory
 // of deleted trees goes back to the C heap at once. Carving takes no atomic
 // operation; giving back takes one.
-#include "dwxparse_pool.h"
+#include "internal/dwxparse_pool.h"
 
 #include <services/rtprim.h>
 
@@ -40,7 +40,7 @@
 #endif
 #endif
 
-namespace dwxparse_pool {
+namespace dwxcore::internal {
 namespace {
 
 constexpr size_t kAlign = 16;
@@ -216,4 +216,4 @@ void Release(void* block, size_t size) noexcept {
     }
 }
 
-}  // namespace dwxparse_pool
+}  // namespace dwxcore::internal

@@ -11,8 +11,8 @@
 // includes recurse, bounded by the include depth limit.
 #include <dwxcore/dwxparse.h>
 
-#include "dwxparse_scan.h"
-#include "dwxparse_token.h"
+#include "internal/dwxparse_scan.h"
+#include "internal/dwxparse_token.h"
 
 #include <services/rtprim.h>
 #include <services/tracer.h>
@@ -45,10 +45,11 @@ struct PTNStringAdopter {
     // straight into the leaf: the reader's String lines mostly take this way.
     static PTNString* MakeShort(const char* name, const char* token) {
         auto node = std::make_unique<PTNString>(name, nullptr);
-        if (UnquoteTokenInto(token, node->acShortValue) != nullptr) {
+        if (dwxcore::internal::UnquoteTokenInto(token, node->acShortValue) != nullptr) {
             node->pcValue = node->acShortValue;
         } else {
-            node->SetValue(UnquoteToken(token).c_str());  // an expansion may apply
+            node->SetValue(
+                dwxcore::internal::UnquoteToken(token).c_str());  // an expansion may apply
         }
         return node.release();
     }
@@ -114,13 +115,14 @@ struct FreeDeleter {
 };
 using HeapText = std::unique_ptr<char, FreeDeleter>;
 
-using dwxparse_scan::BeginsWith;
-using dwxparse_scan::ClassOf;
-using dwxparse_scan::IsWhite;
-using dwxparse_scan::MakeKeyword;
-using dwxparse_scan::Matches;
-using dwxparse_scan::ScanDouble;
-using dwxparse_scan::ScanInteger;
+using dwxcore::internal::BeginsWith;
+using dwxcore::internal::ClassOf;
+using dwxcore::internal::IsWhite;
+using dwxcore::internal::MakeKeyword;
+using dwxcore::internal::Matches;
+using dwxcore::internal::ScanDouble;
+using dwxcore::internal::ScanInteger;
+using dwxcore::internal::UnquoteTokenToHeap;
 
 const char* SourceName(const char* fileName) {
     return fileName ? fileName : "Memory";
@@ -176,19 +178,19 @@ enum class Keyword {
     Other
 };
 
-constexpr dwxparse_scan::KeywordPattern kSubTree = MakeKeyword("subtree");
-constexpr dwxparse_scan::KeywordPattern kString = MakeKeyword("string");
-constexpr dwxparse_scan::KeywordPattern kStringList = MakeKeyword("stringlist");
-constexpr dwxparse_scan::KeywordPattern kInteger = MakeKeyword("integer");
-constexpr dwxparse_scan::KeywordPattern kChar = MakeKeyword("char");
-constexpr dwxparse_scan::KeywordPattern kBool = MakeKeyword("bool");
-constexpr dwxparse_scan::KeywordPattern kBase64 = MakeKeyword("base64");
-constexpr dwxparse_scan::KeywordPattern kDouble = MakeKeyword("double");
-constexpr dwxparse_scan::KeywordPattern kDoubleList = MakeKeyword("doublelist");
-constexpr dwxparse_scan::KeywordPattern kTrue = MakeKeyword("true");
-constexpr dwxparse_scan::KeywordPattern kYes = MakeKeyword("yes");
-constexpr dwxparse_scan::KeywordPattern kOne = MakeKeyword("1");
-constexpr dwxparse_scan::KeywordPattern kY = MakeKeyword("y");
+constexpr dwxcore::internal::KeywordPattern kSubTree = MakeKeyword("subtree");
+constexpr dwxcore::internal::KeywordPattern kString = MakeKeyword("string");
+constexpr dwxcore::internal::KeywordPattern kStringList = MakeKeyword("stringlist");
+constexpr dwxcore::internal::KeywordPattern kInteger = MakeKeyword("integer");
+constexpr dwxcore::internal::KeywordPattern kChar = MakeKeyword("char");
+constexpr dwxcore::internal::KeywordPattern kBool = MakeKeyword("bool");
+constexpr dwxcore::internal::KeywordPattern kBase64 = MakeKeyword("base64");
+constexpr dwxcore::internal::KeywordPattern kDouble = MakeKeyword("double");
+constexpr dwxcore::internal::KeywordPattern kDoubleList = MakeKeyword("doublelist");
+constexpr dwxcore::internal::KeywordPattern kTrue = MakeKeyword("true");
+constexpr dwxcore::internal::KeywordPattern kYes = MakeKeyword("yes");
+constexpr dwxcore::internal::KeywordPattern kOne = MakeKeyword("1");
+constexpr dwxcore::internal::KeywordPattern kY = MakeKeyword("y");
 
 // The keyword of `length` bytes, compared ignoring ASCII case; a keyword
 // that begins with "Bool" is a Bool whatever follows.
@@ -435,9 +437,9 @@ size_t TreeReader::Split(char* line, size_t length, char* first) {
         char* start = p;
         for (;;) {
             unsigned char kind = ClassOf(*p);
-            if (kind == dwxparse_scan::kPlain) {
+            if (kind == dwxcore::internal::kPlain) {
                 ++p;
-            } else if (kind == dwxparse_scan::kQuote) {
+            } else if (kind == dwxcore::internal::kQuote) {
                 do {
                     ++p;
                 } while (*p != '"' && *p != '\0');

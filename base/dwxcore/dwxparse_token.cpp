@@ -1,5 +1,5 @@
 // Quoting, unquoting and the value expansions of the token syntax.
-#include "dwxparse_token.h"
+#include "internal/dwxparse_token.h"
 
 #include <services/rtprim.h>
 #include <services/utilhub.h>
@@ -7,6 +7,7 @@
 #include <stdlib.h>
 #include <string.h>
 
+namespace dwxcore::internal {
 namespace {
 
 const char kListKeyword[] = "MkTokenString";
@@ -184,3 +185,5 @@ void ExpandTranslationCall(std::string& value) {
     const std::string message = value.substr(first + 2, last - first - 2);
     value = _(message.c_str());
 }
+
+}  // namespace dwxcore::internal

@@ -13,11 +13,11 @@
 #include <typeinfo>
 #include <vector>
 
-#include "dwxparse_numbers.h"
+#include "internal/dwxparse_numbers.h"
 
 namespace {
 
-using namespace dwxparse_detail;
+using namespace dwxcore::internal;
 
 const char* TextOrEmpty(const char* text) {
     return text != nullptr ? text : "";

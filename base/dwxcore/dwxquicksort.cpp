@@ -1,11 +1,11 @@
-#include "dwxquicksort.h"
+#include "internal/dwxquicksort.h"
 
 #include <services/rtprim.h>
 
 #include <stdlib.h>
 #include <string.h>
 
-namespace dwxcore_detail {
+namespace dwxcore::internal {
 namespace {
 
 typedef int (*Compare)(const void*, const void*);
@@ -110,4 +110,4 @@ void QuickSort(void* base, size_t count, size_t size, int (*compare)(const void*
     sorter.Sort(static_cast<char*>(base), count);
 }
 
-}  // namespace dwxcore_detail
+}  // namespace dwxcore::internal

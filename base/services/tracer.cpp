@@ -1,6 +1,6 @@
 #include <services/tracer.h>
 
-#include "utilhub_internal.h"
+#include "internal/utilhub_internal.h"
 
 #include <stdarg.h>
 
@@ -27,7 +27,7 @@ const char* Debugger::FormatString(const char* format, ...) {
     thread_local std::string text;
     va_list args;
     va_start(args, format);
-    text = utilhub_internal::FormatV(format, args);
+    text = dwxservices::internal::FormatV(format, args);
     va_end(args);
     return text.c_str();
 }

@@ -2,7 +2,7 @@
 // the "etc"/"pro" search and environment expansion.
 #include <services/utilhub.h>
 
-#include "utilhub_internal.h"
+#include "internal/utilhub_internal.h"
 
 #include <stdlib.h>
 #include <string.h>
@@ -74,7 +74,7 @@ bool IsReadableKind(const struct stat& info) {
 
 }  // namespace
 
-FILE* utilhub_internal::OpenReadableFile(const char* path) {
+FILE* dwxservices::internal::OpenReadableFile(const char* path) {
     if (!path || !*path) {
         return nullptr;
     }
@@ -111,7 +111,7 @@ FILE* utilhub_internal::OpenReadableFile(const char* path) {
 }
 
 int DKCheck(const char* path) {
-    FILE* file = utilhub_internal::OpenReadableFile(path);
+    FILE* file = dwxservices::internal::OpenReadableFile(path);
     if (!file) {
         return 0;
     }

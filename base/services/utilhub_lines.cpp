@@ -1,14 +1,14 @@
 // Line-by-line reading of text files and buffers through one reused buffer.
 #include <services/utilhub.h>
 
-#include "utilhub_internal.h"
+#include "internal/utilhub_internal.h"
 
 #include <errno.h>
 #include <stdlib.h>
 #include <string.h>
 
-using utilhub_internal::LineAt;
-using utilhub_internal::StartsWithBom;
+using dwxservices::internal::LineAt;
+using dwxservices::internal::StartsWithBom;
 
 namespace {
 
@@ -63,7 +63,7 @@ void TextLineReader::Reserve(size_t size) {
 
 int TextLineReader::OpenFile(const char* path) {
     Close();
-    poFile = utilhub_internal::OpenReadableFile(path);
+    poFile = dwxservices::internal::OpenReadableFile(path);
     if (!poFile) {
         return 0;
     }

@@ -1,14 +1,14 @@
 // String lists: building, copying, tokenizing and converting to and from text.
 #include <services/utilhub.h>
 
-#include "utilhub_internal.h"
+#include "internal/utilhub_internal.h"
 
 #include <stdlib.h>
 #include <string.h>
 
-using utilhub_internal::IsWhite;
-using utilhub_internal::LineAt;
-using utilhub_internal::StartsWithBom;
+using dwxservices::internal::IsWhite;
+using dwxservices::internal::LineAt;
+using dwxservices::internal::StartsWithBom;
 
 namespace {
 

@@ -1,13 +1,13 @@
 // Text helpers: white space, formatted heap strings and the date text.
 #include <services/utilhub.h>
 
-#include "utilhub_internal.h"
+#include "internal/utilhub_internal.h"
 
 #include <stdarg.h>
 #include <string.h>
 #include <time.h>
 
-using utilhub_internal::IsWhite;
+using dwxservices::internal::IsWhite;
 
 char* LSCGetFirstNonWhiteSpace(char* text) {
     if (!text) {
@@ -75,7 +75,7 @@ std::string& TrimWhitespace(std::string& text) {
     return text;
 }
 
-std::string utilhub_internal::FormatV(const char* format, va_list args) {
+std::string dwxservices::internal::FormatV(const char* format, va_list args) {
     std::string text;
     if (!format) {
         return text;
@@ -94,7 +94,7 @@ std::string utilhub_internal::FormatV(const char* format, va_list args) {
 char* HSPrintf(const char* format, ...) {
     va_list args;
     va_start(args, format);
-    std::string text = utilhub_internal::FormatV(format, args);
+    std::string text = dwxservices::internal::FormatV(format, args);
     va_end(args);
     char* copy = static_cast<char*>(HMalloc(text.size() + 1));
     memcpy(copy, text.c_str(), text.size() + 1);
