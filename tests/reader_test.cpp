@@ -579,9 +579,9 @@ TEST_F(ReaderTest, LogTakesReportsAndWarningsWithTheirLines) {
         {"( config SubTree\n(x Integer 1)\n)\n(y Integer 2)\n",
          {},
          {"103/3 Memory:1", "102/3 Memory:3"}},
-        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n",
+        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n(n Integer -2147483649)\n",
          {},
-         {"104/3 Memory:1", "104/3 Memory:2", "104/3 Memory:3"}},
+         {"104/3 Memory:1", "104/3 Memory:2", "104/3 Memory:3", "104/3 Memory:4"}},
         {"(d Double 1.5x)\n(f Double abc)\n", {}, {"105/3 Memory:1", "105/3 Memory:2"}},
         {"#\n\n(s String \"a\" \"b\")\n", {}, {"106/3 Memory:3"}},
     };
