@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <string>
 #include <type_traits>
 #include <vector>
 
@@ -151,22 +152,46 @@ TEST(ObjectTest, AddContainerOfItselfAddsEachMemberOnceMore) {
     }
 }
 
+// Small and large containers, with no repeat, one pointer held twice far
+// apart, and every pointer held twice; a host container whose Remove refuses
+// is emptied through its walk instead.
 TEST(ObjectTest, DestroyContentsDeletesEachMemberOnce) {
-    DWXBag bag;
-    DWXLinkedList list;
-    DWXArray array;
-    DWXPackedArray packed;
-    HostContainer host;
-    for (DWXContainer* container :
-         std::vector<DWXContainer*>{&bag, &list, &array, &packed, &host}) {
-        CountingObject::Reset();
-        for (int i = 0; i < 5; ++i) {
-            container->Add(new CountingObject(i));
+    struct Shape {
+        int members;
+        bool allTwice;
+        int repeated;  // the member also added at the end, or -1
+    } shapes[] = {{1, false, -1},  {1, true, -1},  {5, true, -1}, {2, false, 0},
+                  {40, false, -1}, {40, false, 3}, {40, true, -1}};
+    for (const Shape& shape : shapes) {
+        DWXBag bag;
+        DWXLinkedList list;
+        DWXArray array;
+        DWXPackedArray packed;
+        HostContainer host, refusing;
+        for (DWXContainer* container :
+             std::vector<DWXContainer*>{&bag, &list, &array, &packed, &host, &refusing}) {
+            CountingObject::Reset();
+            std::vector<DWXObject*> added;
+            for (int i = 0; i < shape.members; ++i) {
+                added.push_back(new CountingObject(i));
+                container->Add(added.back());
+            }
+            if (shape.allTwice) {
+                container->AddContainer(container);
+            }
+            if (shape.repeated >= 0) {
+                container->Add(added[static_cast<size_t>(shape.repeated)]);
+            }
+            refusing.refuseRemove = container == &refusing;
+            container->DestroyContents();  // the non-virtual one
+            const std::string where =
+                std::string(container->GetClassName()) + " of " + std::to_string(shape.members);
+            EXPECT_EQ(CountingObject::destroyed, shape.members) << where;
+            if (container != &refusing) {
+                EXPECT_EQ(container->IsEmpty(), 1) << where;
+            }
         }
-        container->AddContainer(container);  // every pointer twice
-        container->DestroyContents();        // the non-virtual one
-        EXPECT_EQ(container->IsEmpty(), 1) << container->GetClassName();
-        EXPECT_EQ(CountingObject::destroyed, 5) << container->GetClassName();
+        refusing.members.clear();  // what it would not give up is deleted
     }
 }
 

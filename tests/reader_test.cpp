@@ -55,6 +55,13 @@ std::unique_ptr<PTNSubTree> Read(const std::string& text) {
 }
 
 TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
+    // A line of more tokens than the reader first makes room for, twice over.
+    std::string longLine = "(l StringList", longNode = "PTNStringList=";
+    for (int i = 0; i < 40; ++i) {
+        longLine += " v" + std::to_string(i);
+        longNode += std::string(i ? " " : "") + "\"v" + std::to_string(i) + "\"";
+    }
+    longLine += ")";
     struct Row {
         const char* line;
         const char* node;  // class=value, or empty: no node
@@ -91,6 +98,7 @@ TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
         {"(x Integer2 1)", ""},
         {"(x Base\x16\x14 YWI)", ""},
         {"(x Bo 1)", ""},
+        {longLine.c_str(), longNode.c_str()},
     };
     for (const Row& row : rows) {
         // The row's node, if any, comes first and "after" is read regardless.
@@ -571,9 +579,9 @@ TEST_F(ReaderTest, LogTakesReportsAndWarningsWithTheirLines) {
         {"( config SubTree\n(x Integer 1)\n)\n(y Integer 2)\n",
          {},
          {"103/3 Memory:1", "102/3 Memory:3"}},
-        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n",
+        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n(n Integer -2147483649)\n",
          {},
-         {"104/3 Memory:1", "104/3 Memory:2", "104/3 Memory:3"}},
+         {"104/3 Memory:1", "104/3 Memory:2", "104/3 Memory:3", "104/3 Memory:4"}},
         {"(d Double 1.5x)\n(f Double abc)\n", {}, {"105/3 Memory:1", "105/3 Memory:2"}},
         {"#\n\n(s String \"a\" \"b\")\n", {}, {"106/3 Memory:3"}},
     };

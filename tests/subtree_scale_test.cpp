@@ -127,6 +127,25 @@ TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
     }
 }
 
+// Names that keep arriving after the index is built, by append and by
+// rename, outgrow its table again and again; every name is still found once.
+TEST(SubTreeIndexTest, NewNamesAfterTheIndexIsBuiltAreAllFound) {
+    PTNSubTree tree("t");
+    std::vector<std::string> names;
+    for (int i = 0; i < 600; ++i) {
+        names.push_back("n" + std::to_string(i));
+        tree.AddChild(new PTNInteger(i % 3 ? names.back().c_str() : "r", i));
+        if (i % 3 == 0) {
+            tree.GetChild("r")->SetName(names.back().c_str());  // the one just added
+        }
+        ASSERT_EQ(tree.GetChildAsInteger(names.back().c_str()), i);  // builds the index at 9
+    }
+    for (int i = 0; i < 600; ++i) {
+        ASSERT_EQ(tree.GetChildAsInteger(names[static_cast<size_t>(i)].c_str()), i);
+        ASSERT_EQ(tree.GetNumberOfOccurence(names[static_cast<size_t>(i)].c_str()), 1) << i;
+    }
+}
+
 // The index reads names a word at a time with a tail of up to seven bytes:
 // names of every length that differ in a single byte, wherever it lies, are
 // told apart, and found again whatever the case of their letters.

@@ -50,6 +50,11 @@ TEST(WriterTest, SubtreesAndIndents) {
     EXPECT_EQ(Text(config), expected);
     EXPECT_EQ(Captured([&](FILE* f) { fputs("before\n", f), config.WriteToFile(f); }),
               "before\n" + expected);
+
+    // A child deleted by hand leaves an empty slot behind, which writes nothing.
+    delete config.GetChild("title");
+    const std::string title = "  (title String \"Main window\")\n";
+    EXPECT_EQ(Text(config), expected.erase(expected.find(title), title.size()));
 }
 
 TEST(WriterTest, EveryLeafClassAndEmptyFields) {

@@ -3,7 +3,6 @@
 #include "internal/dwxcontainer_internal.h"
 
 #include <algorithm>
-#include <unordered_set>
 #include <vector>
 
 namespace {
@@ -187,33 +186,35 @@ DWXValidatable::~DWXValidatable() {}
 namespace dwxcore::internal {
 
 size_t ClearRepeats(DWXObject** items, size_t count) {
-    // Repeats are rare (AddContainer of a container into itself), so look for
-    // them cheaply first and pay for a set only when there are some.
-    bool repeats = false;
-    if (count <= 16) {
-        for (size_t i = 1; i < count && !repeats; ++i) {
-            for (size_t j = 0; j < i; ++j) {
-                if (items[i] && items[j] == items[i]) {
-                    repeats = true;
-                    break;
-                }
-            }
+    // One sorted copy of the pointers tells whether any repeats, which is
+    // rare (AddContainer of a container into itself), and then marks the
+    // first holder of each. A single way for every size: no bench row shows
+    // a shortcut for small containers buying anything next to the deletes.
+    std::vector<DWXObject*> sorted;
+    sorted.reserve(count);
+    for (size_t i = 0; i < count; ++i) {
+        if (items[i]) {
+            sorted.push_back(items[i]);
         }
-    } else {
-        std::vector<DWXObject*> sorted(items, items + count);
-        sorted.erase(std::remove(sorted.begin(), sorted.end(), nullptr), sorted.end());
-        std::sort(sorted.begin(), sorted.end());
-        repeats = std::adjacent_find(sorted.begin(), sorted.end()) != sorted.end();
     }
-    if (!repeats) {
+    std::sort(sorted.begin(), sorted.end());
+    if (std::adjacent_find(sorted.begin(), sorted.end()) == sorted.end()) {
         return 0;
     }
+    sorted.erase(std::unique(sorted.begin(), sorted.end()), sorted.end());
+    std::vector<bool> seen(sorted.size());
     size_t cleared = 0;
-    std::unordered_set<DWXObject*> seen;
     for (size_t i = 0; i < count; ++i) {
-        if (items[i] && !seen.insert(items[i]).second) {
+        if (!items[i]) {
+            continue;
+        }
+        const size_t at = static_cast<size_t>(
+            std::lower_bound(sorted.begin(), sorted.end(), items[i]) - sorted.begin());
+        if (seen[at]) {
             items[i] = nullptr;
             ++cleared;
+        } else {
+            seen[at] = true;
         }
     }
     return cleared;

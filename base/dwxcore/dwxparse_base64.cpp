@@ -80,12 +80,19 @@ inline char* PutGroup(char* out, uint32_t group) {
 // SSSE3: sixteen characters per step, where the processor has it (checked
 // once at run time). Same results as the table code above, which handles
 // whatever is left and every block that holds a byte outside the alphabet.
+// DWXCORE_BASE64_PORTABLE=1 in the environment keeps to the table code, so
+// that the tests run it on every machine and a doubt about the vector code
+// can be ruled out in the field.
 
 #if defined(__GNUC__) && (defined(__x86_64__) || defined(__i386__))
 #define DWX_BASE64_SSSE3 1
 
 bool HaveSsse3() {
-    static const bool have = __builtin_cpu_supports("ssse3");
+    static const bool have = [] {
+        const char* portable = getenv("DWXCORE_BASE64_PORTABLE");
+        return !(portable != nullptr && strcmp(portable, "1") == 0) &&
+               __builtin_cpu_supports("ssse3");
+    }();
     return have;
 }
 

@@ -177,7 +177,6 @@ class TreeWriter {
         std::vector<Open> open;
         OpeningLine(root, level);
         open.push_back({&root, 0, root.GetChildren()->GetMaxIndex()});
-        PrefetchFirst(root, open.back().top);
         while (!open.empty()) {
             Open& current = open.back();
             const size_t depth = level + open.size() - 1;
@@ -187,9 +186,6 @@ class TreeWriter {
                 continue;
             }
             const DWXArray& children = *current.tree->GetChildren();
-            if (current.next + kAhead < current.top) {
-                Prefetch(children[current.next + kAhead]);
-            }
             auto* child = static_cast<const DWXParseTreeNode*>(children[current.next++]);
             if (child == nullptr) {
                 continue;
@@ -205,7 +201,6 @@ class TreeWriter {
                 OpeningLine(*subtree, depth + 1);
                 // `current` is not used after this.
                 open.push_back({subtree, 0, subtree->GetChildren()->GetMaxIndex()});
-                PrefetchFirst(*subtree, open.back().top);
             } else {
                 Leaf(*child, kind, depth);
             }
@@ -213,25 +208,6 @@ class TreeWriter {
     }
 
   private:
-    // The nodes of a large tree lie all over the heap; asking for the next
-    // few children early overlaps their cache misses.
-    static constexpr int kAhead = 8;
-
-    static void Prefetch(const void* address) {
-#if defined(__GNUC__)
-        __builtin_prefetch(address);
-#else
-        (void)address;
-#endif
-    }
-
-    static void PrefetchFirst(const PTNSubTree& tree, int top) {
-        const DWXArray& children = *tree.GetChildren();
-        for (int i = 0; i < top && i < kAhead; ++i) {
-            Prefetch(children[i]);
-        }
-    }
-
     // 2 * level blanks, from a run of blanks kept long enough.
     const char* Blanks(size_t count) {
         if (oBlanks.size() < count) {

@@ -9,8 +9,8 @@ namespace dwxcore::internal {
 
 // Clears every entry of items[0, count) that repeats an earlier non-null
 // entry, so that a pointer held in several places is deleted once; returns
-// the number of entries cleared. O(n) up to 16 entries, else O(n log n) to
-// find out whether there are repeats at all, plus O(n) expected when there are.
+// the number of entries cleared. O(n log n), with one allocation of n
+// pointers.
 size_t ClearRepeats(DWXObject** items, size_t count);
 
 // DestroyContents of a linked list: in list order, each node is unlinked
