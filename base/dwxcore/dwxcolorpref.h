@@ -13,12 +13,8 @@ template <class T>
 class PreferenceFormat : public PreferenceFormatIF {
   protected:
     explicit PreferenceFormat(PreferenceModel* model) : poModel(model) {}
-    PreferenceFormat(const PreferenceFormat& other)
-        : PreferenceFormatIF(), poModel(other.poModel) {}
-    PreferenceFormat& operator=(const PreferenceFormat& other) {
-        poModel = other.poModel;
-        return *this;
-    }
+    PreferenceFormat(const PreferenceFormat& other) = default;
+    PreferenceFormat& operator=(const PreferenceFormat& other) = default;
 
   public:
     ~PreferenceFormat() override {}

@@ -69,6 +69,8 @@ DWXObject* DWXLinkedList::Start(DWXIter* iter) const {
 }
 
 DWXObject* DWXLinkedList::Next(DWXIter* iter) const {
+    // An iterator's position is an integer in the public DWXIter, and a list
+    // keeps its node's address there. NOLINTNEXTLINE(performance-no-int-to-ptr)
     DWXListNode* node = reinterpret_cast<DWXListNode*>(static_cast<intptr_t>(GetPosition(iter)));
     if (!node) {
         // Bound with SetTarget and never started: begin at the first node,

@@ -3,6 +3,8 @@
 
 #include <services/rtprim.h>
 
+#include <algorithm>
+
 #include <stdint.h>
 #include <stdlib.h>
 #include <string.h>
@@ -282,7 +284,7 @@ std::string base64_encode(const unsigned char* bytes, unsigned int length) {
         return text;
     }
     text.resize(4 * ((static_cast<size_t>(length) + 2) / 3));
-    const size_t whole = length / 3 * 3;
+    const size_t whole = static_cast<size_t>(length) / 3 * 3;
     char* out = EncodeWhole(bytes, whole, &text[0]);
     // A final one or two bytes, completed with zero bits and padded.
     const unsigned int rest = length % 3;
@@ -366,9 +368,7 @@ unsigned char* PTNBase64::Decode(const char* text, unsigned int* length) const {
     const std::string bytes = base64_decode(source != nullptr ? source : "");
     // HMalloc(0) is a valid block, so 0 bytes still give something free() takes.
     unsigned char* buffer = static_cast<unsigned char*>(HMalloc(bytes.size()));
-    if (!bytes.empty()) {
-        memcpy(buffer, bytes.data(), bytes.size());
-    }
+    std::copy(bytes.begin(), bytes.end(), buffer);
     if (length != nullptr) {
         *length = static_cast<unsigned int>(bytes.size());
     }

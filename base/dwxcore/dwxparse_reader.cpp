@@ -381,6 +381,18 @@ class TreeReader {
     void ReportReadError(const char* fileName, int line, int error);
 
   private:
+    // The subtrees opened and not yet closed, each with the line count at its
+    // opening line.
+    using OpenList = std::vector<std::pair<PTNSubTree*, int>>;
+
+    // A closing line: closes the innermost open subtree. False when none is
+    // open, which ends the reading.
+    bool CloseSubTree(OpenList& open, const char* fileName, int line);
+    // A node line of `tokenCount` tokens (in oTokens) at `line`: a directive,
+    // a subtree opened into `open` or a leaf appended to the innermost open
+    // subtree (or `root`).
+    void ReadNodeLine(PTNSubTree* root, OpenList& open, size_t tokenCount,
+                      const PTNSourceFile* source, int line);
     [[noreturn]] void ReportCorruptLine(const char* fileName, int line);
     void Warn(int code, const char* fileName, int line, const char* message) {
         PTNReadLogWriter::AddWarning(*poLog, code, SourceName(fileName), line, message);
@@ -403,6 +415,27 @@ class TreeReader {
     std::vector<double> oDoubles;
 };
 
+// The end of the token that starts at `p`: a run of bytes up to white space or
+// the end, where a quoted run goes on to its closing quote (or the end)
+// whatever it holds.
+inline char* TokenEnd(char* p) {
+    for (;;) {
+        unsigned char kind = ClassOf(*p);
+        if (kind == dwxcore::internal::kPlain) {
+            ++p;
+        } else if (kind == dwxcore::internal::kQuote) {
+            do {
+                ++p;
+            } while (*p != '"' && *p != '\0');
+            if (*p == '"') {
+                ++p;
+            }
+        } else {
+            return p;
+        }
+    }
+}
+
 size_t TreeReader::Split(char* line, size_t length, char* first) {
     char* end = line + length;
     while (end > first && IsWhite(end[-1])) {
@@ -416,9 +449,7 @@ size_t TreeReader::Split(char* line, size_t length, char* first) {
     }
     *end = '\0';
 
-    // Tokens are runs of bytes up to white space or the end; a quoted run
-    // goes on to its closing quote (or the end) whatever it holds. The arrays
-    // are used through local pointers: the bytes written into the line could
+    // The arrays are used through local pointers: the bytes written into the line could
     // otherwise be taken to change the vectors, which would then be read
     // again for every token (about a tenth of the read's instructions).
     char** tokens = oTokens.data();
@@ -435,21 +466,7 @@ size_t TreeReader::Split(char* line, size_t length, char* first) {
             room = oTokens.size();
         }
         char* start = p;
-        for (;;) {
-            unsigned char kind = ClassOf(*p);
-            if (kind == dwxcore::internal::kPlain) {
-                ++p;
-            } else if (kind == dwxcore::internal::kQuote) {
-                do {
-                    ++p;
-                } while (*p != '"' && *p != '\0');
-                if (*p == '"') {
-                    ++p;
-                }
-            } else {
-                break;
-            }
-        }
+        p = TokenEnd(p);
         tokens[count] = start;
         lengths[count] = static_cast<size_t>(p - start);
         ++count;
@@ -529,13 +546,61 @@ void TreeReader::CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, cons
     }
 }
 
+bool TreeReader::CloseSubTree(OpenList& open, const char* fileName, int line) {
+    if (open.empty()) {
+        if (poLog) {
+            Warn(PTNReadLog::kTopLevelClose, fileName, line,
+                 _("Closing line outside every subtree; the rest is not read."));
+        }
+        return false;
+    }
+    open.pop_back();
+    return true;
+}
+
+void TreeReader::ReadNodeLine(PTNSubTree* root, OpenList& open, size_t tokenCount,
+                              const PTNSourceFile* source, int line) {
+    const char* fileName = source->name;
+    if (tokenCount < 2 || oTokens[0][0] != '(') {
+        ReportCorruptLine(fileName, line);
+    }
+    PTNSubTree* current = open.empty() ? root : open.back().first;
+    const char* name = oTokens[0] + 1;
+    bool blankName = false;
+    if (poLog && oLengths[0] == 1) {
+        blankName = true;
+        Warn(PTNReadLog::kBlankAfterParen, fileName, line,
+             MkName(_("Blank between '(' and the name: the name is empty and '%s' is "
+                      "taken as the type keyword."),
+                    oTokens[1]));
+    }
+    bool required = false;
+    Keyword kind = Keyword::Other;
+    if (IsDirective(name, required)) {
+        Include(current, name, oTokens[1], line, source, required);
+    } else if ((kind = Classify(oTokens[1], oLengths[1])) == Keyword::SubTree) {
+        auto subtree = std::make_unique<PTNSubTree>(name);
+        PTNSubTree* raw = subtree.get();
+        PTNSourceSetter::Set(raw, source, line);
+        PTNTreeBuilder::Append(current, subtree.release());
+        open.emplace_back(raw, line);
+    } else if (tokenCount < 3) {
+        ReportCorruptLine(fileName, line);
+    } else {
+        if (poLog) {
+            CheckLeaf(kind, tokenCount, blankName, fileName, line);
+        }
+        if (DWXParseTreeNode* leaf = BuildLeaf(current, name, kind, tokenCount)) {
+            PTNSourceSetter::Set(leaf, source, line);
+        }
+    }
+}
+
 template <typename Lines>
 bool TreeReader::Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* source, int& count) {
-    const char* fileName = source->name;
-    // The subtrees opened and not yet closed, each with the count at its
-    // opening line: an error inside one ends the reading with that count, as
-    // the level that holds it would have kept.
-    std::vector<std::pair<PTNSubTree*, int>> open;
+    // An error inside an open subtree ends the reading with the count at its
+    // opening line, as the level that holds it would have kept.
+    OpenList open;
     int counter = count;
     size_t length;
     while (char* line = lines.Next(&length)) {
@@ -551,49 +616,12 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* sourc
         try {
             size_t tokenCount = Split(line, length, first);
             if (tokenCount > 0 && oTokens[0][0] == ')') {
-                if (open.empty()) {
-                    if (poLog) {
-                        Warn(PTNReadLog::kTopLevelClose, fileName, counter,
-                             _("Closing line outside every subtree; the rest is not read."));
-                    }
+                if (!CloseSubTree(open, source->name, counter)) {
                     break;
                 }
-                open.pop_back();
                 continue;
             }
-            if (tokenCount < 2 || oTokens[0][0] != '(') {
-                ReportCorruptLine(fileName, counter);
-            }
-            PTNSubTree* current = open.empty() ? root : open.back().first;
-            const char* name = oTokens[0] + 1;
-            bool blankName = false;
-            if (poLog && oLengths[0] == 1) {
-                blankName = true;
-                Warn(PTNReadLog::kBlankAfterParen, fileName, counter,
-                     MkName(_("Blank between '(' and the name: the name is empty and '%s' is "
-                              "taken as the type keyword."),
-                            oTokens[1]));
-            }
-            bool required = false;
-            Keyword kind = Keyword::Other;
-            if (IsDirective(name, required)) {
-                Include(current, name, oTokens[1], counter, source, required);
-            } else if ((kind = Classify(oTokens[1], oLengths[1])) == Keyword::SubTree) {
-                auto subtree = std::make_unique<PTNSubTree>(name);
-                PTNSubTree* raw = subtree.get();
-                PTNSourceSetter::Set(raw, source, counter);
-                PTNTreeBuilder::Append(current, subtree.release());
-                open.emplace_back(raw, counter);
-            } else if (tokenCount < 3) {
-                ReportCorruptLine(fileName, counter);
-            } else {
-                if (poLog) {
-                    CheckLeaf(kind, tokenCount, blankName, fileName, counter);
-                }
-                if (DWXParseTreeNode* leaf = BuildLeaf(current, name, kind, tokenCount)) {
-                    PTNSourceSetter::Set(leaf, source, counter);
-                }
-            }
+            ReadNodeLine(root, open, tokenCount, source, counter);
         } catch (const tzn::Exception&) {
             // Outside every subtree the exception is the caller's; inside
             // one it ends the reading quietly, keeping what was read.

@@ -674,7 +674,7 @@ int PTNSubTree::GetChildAsInteger(const char* name) const {
 
 char PTNSubTree::GetChildAsChar(const char* name) const {
     auto* child = dynamic_cast<PTNChar*>(GetChild(name));
-    return child != nullptr ? child->GetValue() : 0;
+    return child != nullptr ? child->GetValue() : '\0';
 }
 
 double PTNSubTree::GetChildAsDouble(const char* name) const {

@@ -39,7 +39,7 @@ char* Put(char* at, const char* text, size_t size) {
 // is handed over whole.
 class TextOut {
   public:
-    static constexpr size_t kBlock = 64 * 1024;
+    static constexpr size_t kBlock = size_t{64} * 1024;
 
     // A stream receives blocks of kBlock bytes; without one the text starts
     // in a smaller buffer that grows.

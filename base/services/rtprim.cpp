@@ -112,7 +112,8 @@ void HPrefault(void* block, size_t size) {
     if (end > start) {
         // A kernel without the call (before Linux 5.14) says EINVAL; the
         // pages are then faulted in as they are written, as without it.
-        (void)madvise(reinterpret_cast<void*>(start), end - start, MADV_POPULATE_WRITE);
+        (void)madvise(static_cast<char*>(block) + (start - reinterpret_cast<uintptr_t>(block)),
+                      end - start, MADV_POPULATE_WRITE);
     }
 #else
     (void)block;

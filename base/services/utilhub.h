@@ -86,6 +86,10 @@ class DWXSERVICES_API TextLineReader {
     void Close();
     bool Fill();
     void Reserve(size_t size);
+    // The next line of a walked buffer or of the file, copied into or left in
+    // pcBuffer, its length in `size` without a terminator; null after the last.
+    char* NextFromBuffer(size_t* size);
+    char* NextFromFile(size_t* size);
 
     FILE* poFile;
     char* pcBuffer;  // nCapacity bytes and room for a terminator

@@ -14,7 +14,7 @@ namespace {
 
 // The size of a block read from a file: large enough that reads are few,
 // small enough to stay in cache and to be touched once, not once per file.
-constexpr size_t kBlockSize = 128 * 1024;
+constexpr size_t kBlockSize = size_t{128} * 1024;
 
 }  // namespace
 
@@ -127,51 +127,58 @@ bool TextLineReader::Fill() {
     return true;
 }
 
+char* TextLineReader::NextFromBuffer(size_t* size) {
+    if (pcText >= pcTextEnd) {
+        return nullptr;
+    }
+    const char* start = pcText;
+    pcText = LineAt(start, pcTextEnd, size);
+    Reserve(*size);
+    memcpy(pcBuffer, start, *size);
+    return pcBuffer;
+}
+
+char* TextLineReader::NextFromFile(size_t* size) {
+    if (!poFile) {
+        return nullptr;
+    }
+    // Line ends are searched for once: a block read behind a partial
+    // line is scanned from where the last search stopped.
+    const char* lineEnd;
+    for (;;) {
+        lineEnd = static_cast<const char*>(memchr(pcBuffer + nScanned, '\n', nFilled - nScanned));
+        if (lineEnd || bEnd) {
+            break;
+        }
+        nScanned = nFilled;
+        Fill();
+    }
+    // Bytes after the last line end are a last line without a line
+    // end, unless a read error cut them off: a half line read as a whole
+    // one would give a wrong value.
+    if (!lineEnd && (nBegin == nFilled || bFailed)) {
+        nBegin = nScanned = nFilled;
+        return nullptr;
+    }
+    char* line = pcBuffer + nBegin;
+    size_t next = lineEnd ? static_cast<size_t>(lineEnd - pcBuffer) + 1 : nFilled;
+    size_t length = (lineEnd ? static_cast<size_t>(lineEnd - pcBuffer) : nFilled) - nBegin;
+    if (length && line[length - 1] == '\r') {
+        --length;  // before a line end, or at the very end of the file
+    }
+    nBegin = nScanned = next;
+    if (bNul) {
+        length = strnlen(line, length);
+    }
+    *size = length;
+    return line;
+}
+
 char* TextLineReader::Next(size_t* length) {
     size_t size = 0;
-    char* line = nullptr;
-    if (pcText) {
-        if (pcText >= pcTextEnd) {
-            return nullptr;
-        }
-        const char* start = pcText;
-        pcText = LineAt(start, pcTextEnd, &size);
-        Reserve(size);
-        memcpy(pcBuffer, start, size);
-        line = pcBuffer;
-    } else {
-        if (!poFile) {
-            return nullptr;
-        }
-        // Line ends are searched for once: a block read behind a partial
-        // line is scanned from where the last search stopped.
-        const char* lineEnd;
-        for (;;) {
-            lineEnd =
-                static_cast<const char*>(memchr(pcBuffer + nScanned, '\n', nFilled - nScanned));
-            if (lineEnd || bEnd) {
-                break;
-            }
-            nScanned = nFilled;
-            Fill();
-        }
-        // Bytes after the last line end are a last line without a line
-        // end, unless a read error cut them off: a half line read as a whole
-        // one would give a wrong value.
-        if (!lineEnd && (nBegin == nFilled || bFailed)) {
-            nBegin = nScanned = nFilled;
-            return nullptr;
-        }
-        line = pcBuffer + nBegin;
-        size_t next = lineEnd ? static_cast<size_t>(lineEnd - pcBuffer) + 1 : nFilled;
-        size = (lineEnd ? static_cast<size_t>(lineEnd - pcBuffer) : nFilled) - nBegin;
-        if (size && line[size - 1] == '\r') {
-            --size;  // before a line end, or at the very end of the file
-        }
-        nBegin = nScanned = next;
-        if (bNul) {
-            size = strnlen(line, size);
-        }
+    char* line = pcText ? NextFromBuffer(&size) : NextFromFile(&size);
+    if (!line) {
+        return nullptr;
     }
     line[size] = '\0';
     if (length) {

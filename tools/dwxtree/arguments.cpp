@@ -44,72 +44,77 @@ bool Arguments::Parse(int argc, const char* const* argv, const std::vector<Optio
     oGiven.clear();
     oOperands.clear();
     error.clear();
-    auto fail = [&error](const std::string& message) {
-        if (error.empty()) {
-            error = message;
-        }
-    };
-
     bool optionsEnded = false;
     for (int i = 1; i < argc; ++i) {
         std::string argument = argv[i];
         if (optionsEnded || !IsOption(argument)) {
             oOperands.push_back(argument);
-            continue;
-        }
-        if (argument == "--") {
+        } else if (argument == "--") {
             optionsEnded = true;
-            continue;
-        }
-        // "--name=value" carries its value; a single-hyphen spelling never
-        // does, so "-o=x" is the unknown option "-o=x", not a surprise.
-        std::string name = argument;
-        bool inlineValue = false;
-        std::string value;
-        size_t equals = argument.find('=');
-        if (argument.compare(0, 2, "--") == 0 && equals != std::string::npos) {
-            name = argument.substr(0, equals);
-            value = argument.substr(equals + 1);
-            inlineValue = true;
-        }
-        const OptionRule* rule = FindRule(rules, name);
-        if (!rule) {
-            fail("unknown option '" + name + "'");
-            continue;
-        }
-        Given* given = Find(rule->key);
-        if (given && !rule->repeatable) {
-            fail("option " + name + " given more than once");
-            continue;
-        }
-        if (!given) {
-            oGiven.push_back(Given{rule->key, name, {}});
-            given = &oGiven.back();
-        }
-        if (rule->takes == Takes::kNothing) {
-            if (inlineValue) {
-                fail("option " + name + " takes no value");
-            }
-            continue;
-        }
-        if (!inlineValue) {
-            if (i + 1 >= argc) {
-                fail("option " + name + " needs a value");
-                continue;
-            }
-            value = argv[++i];
-        }
-        given->values.push_back(value);
-        if (rule->takes != Takes::kValues || oOperands.empty()) {
-            continue;
-        }
-        int limit = operandLimit(oOperands[0]);
-        while (i + 1 < argc && !IsOption(argv[i + 1]) &&
-               static_cast<int>(oOperands.size()) - 1 >= limit) {
-            given->values.push_back(argv[++i]);
+        } else {
+            i = TakeOption(argument, i, Command{argc, argv, rules, operandLimit}, error);
         }
     }
     return error.empty();
+}
+
+int Arguments::TakeOption(const std::string& argument, int i, const Command& command,
+                          std::string& error) {
+    // The first error is the one reported.
+    auto fail = [&error](const std::string& message) {
+        if (error.empty()) {
+            error = message;
+        }
+    };
+    // "--name=value" carries its value; a single-hyphen spelling never
+    // does, so "-o=x" is the unknown option "-o=x", not a surprise.
+    std::string name = argument;
+    bool inlineValue = false;
+    std::string value;
+    size_t equals = argument.find('=');
+    if (argument.compare(0, 2, "--") == 0 && equals != std::string::npos) {
+        name = argument.substr(0, equals);
+        value = argument.substr(equals + 1);
+        inlineValue = true;
+    }
+    const OptionRule* rule = FindRule(command.rules, name);
+    if (!rule) {
+        fail("unknown option '" + name + "'");
+        return i;
+    }
+    Given* given = Find(rule->key);
+    if (given && !rule->repeatable) {
+        fail("option " + name + " given more than once");
+        return i;
+    }
+    if (!given) {
+        oGiven.push_back(Given{rule->key, name, {}});
+        given = &oGiven.back();
+    }
+    if (rule->takes == Takes::kNothing) {
+        if (inlineValue) {
+            fail("option " + name + " takes no value");
+        }
+        return i;
+    }
+    const int argc = command.argc;
+    if (!inlineValue) {
+        if (i + 1 >= argc) {
+            fail("option " + name + " needs a value");
+            return i;
+        }
+        value = command.argv[++i];
+    }
+    given->values.push_back(value);
+    if (rule->takes != Takes::kValues || oOperands.empty()) {
+        return i;
+    }
+    int limit = command.operandLimit(oOperands[0]);
+    while (i + 1 < argc && !IsOption(command.argv[i + 1]) &&
+           static_cast<int>(oOperands.size()) - 1 >= limit) {
+        given->values.push_back(command.argv[++i]);
+    }
+    return i;
 }
 
 Arguments::Given* Arguments::Find(const char* key) {

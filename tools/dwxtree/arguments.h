@@ -59,6 +59,16 @@ class Arguments {
         std::string written;
         std::vector<std::string> values;
     };
+    // The whole command line and what Parse was given to read it with.
+    struct Command {
+        int argc;
+        const char* const* argv;
+        const std::vector<OptionRule>& rules;
+        int (*operandLimit)(const std::string& first);
+    };
+    // Takes the option `argument`, argv[i], and the values that follow it;
+    // returns the index of the last argument taken. Sets `error` unless set.
+    int TakeOption(const std::string& argument, int i, const Command& command, std::string& error);
     Given* Find(const char* key);
     const Given* Find(const char* key) const;
 

@@ -12,7 +12,7 @@ namespace dwxtree {
 enum class StreamResult { kOk, kBadInput, kReadFailed, kWriteFailed };
 
 // A multiple of 3, so that each block encodes to whole groups.
-constexpr size_t kBase64Block = 3 * 64 * 1024;
+constexpr size_t kBase64Block = size_t{3} * 64 * 1024;
 
 // Writes the Base64 text of everything `in` holds to `out` as one line.
 // On failure `error` holds the reason.

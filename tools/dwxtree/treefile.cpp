@@ -205,13 +205,11 @@ void Complain(const std::string& message) {
     Report(std::string(), 0, Severity::kError, message);
 }
 
-bool ReadTreeFile(const std::string& path, TreeFile& out) {
-    bool standardInput = path == kStandardStream;
-    out.root = std::make_unique<PTNSubTree>(path.c_str());
-    out.name = standardInput ? kStandardInputName : path;
-    out.text.clear();
-    out.log = PTNReadLog();
-    FILE* stream = nullptr;
+namespace {
+
+// Reads the tree of `path` (standard input for "-") into `out`, keeping the
+// text read from standard input. False, reported, when nothing could be read.
+bool BuildTree(const std::string& path, bool standardInput, TreeFile& out) {
     if (standardInput) {
         char chunk[65536];
         size_t got;
@@ -223,21 +221,24 @@ bool ReadTreeFile(const std::string& path, TreeFile& out) {
             return false;
         }
         out.root->BuildFromString(out.text.c_str(), &out.log);
-    } else {
-        std::string reason = UnreadableReason(path, true);
-        stream = reason.empty() ? DKOpen(path.c_str(), 4, "r") : nullptr;
-        if (!stream) {
-            Report(path, 0, Severity::kError,
-                   "cannot read: " + (reason.empty() ? ErrorText(errno) : reason));
-            return false;
-        }
-        out.root->BuildFromFile(stream, &out.log);
-        DKClose(stream);
+        return true;
     }
+    std::string reason = UnreadableReason(path, true);
+    FILE* stream = reason.empty() ? DKOpen(path.c_str(), 4, "r") : nullptr;
+    if (!stream) {
+        Report(path, 0, Severity::kError,
+               "cannot read: " + (reason.empty() ? ErrorText(errno) : reason));
+        return false;
+    }
+    out.root->BuildFromFile(stream, &out.log);
+    DKClose(stream);
+    return true;
+}
 
-    // Every report of the read, then every warning, each at its own file
-    // and line. The lines they show are read in one pass per file, as a
-    // file may have a warning on each of its lines.
+// Every report of the read, then every warning, each at its own file and
+// line. The lines they show are read in one pass per file, as a file may
+// have a warning on each of its lines.
+void PrintReadReports(const TreeFile& out, bool standardInput) {
     const auto lists = {&out.log.Reports(), &out.log.Warnings()};
     auto nameOf = [&](const PTNReadReport& report) {
         return standardInput && report.file == kReaderBufferName ? std::string(kStandardInputName)
@@ -263,6 +264,20 @@ bool ReadTreeFile(const std::string& path, TreeFile& out) {
                         Wording(report), lines.at(file).Text(report.line));
         }
     }
+}
+
+}  // namespace
+
+bool ReadTreeFile(const std::string& path, TreeFile& out) {
+    bool standardInput = path == kStandardStream;
+    out.root = std::make_unique<PTNSubTree>(path.c_str());
+    out.name = standardInput ? kStandardInputName : path;
+    out.text.clear();
+    out.log = PTNReadLog();
+    if (!BuildTree(path, standardInput, out)) {
+        return false;
+    }
+    PrintReadReports(out, standardInput);
     return true;
 }
 
