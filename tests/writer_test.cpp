@@ -128,7 +128,7 @@ TEST(WriterTest, LargeTreesReachTheFileWhole) {
     }
     tree.AddChild(new PTNString("huge", std::string(200000, 'h').c_str()));
     char** list = tree.GetAsStringList(0);
-    std::unique_ptr<char, decltype(&free)> joined(StringListToBuffer(list), free);
+    HeapText joined(StringListToBuffer(list));
     EXPECT_EQ(CountStringList(list), 3 * 3000 + 2 + 3000 * 2 + 1);
     DestroyStringList(list);
     EXPECT_EQ(Captured([&](FILE* f) { tree.WriteToFile(f); }), joined.get());
