@@ -8,6 +8,7 @@
 // absolute path or through the environment are skipped, so that no file of
 // the machine is read.
 #include <dwxcore/dwxparse.h>
+#include <services/rtprim.h>
 #include <services/utilhub.h>
 
 #include "fuzz_expand.h"
@@ -59,22 +60,32 @@ Findings Inspect(const PTNSubTree* tree) {
             auto* node = dynamic_cast<DWXParseTreeNode*>(object);
             FUZZ_CHECK(node != nullptr);
             FUZZ_CHECK(node->GetParentRef() == subtree);
-            if (auto* child = dynamic_cast<PTNSubTree*>(node)) {
-                pending.push_back(child);
-            } else if (auto* string = dynamic_cast<PTNString*>(node)) {
-                expands |= string->GetValue() && ExpandsOnReading(string->GetValue());
-            } else if (auto* list = dynamic_cast<PTNStringList*>(node)) {
-                for (char** entry = list->GetValue(); entry && *entry; ++entry) {
-                    expands |= ExpandsOnReading(*entry);
+            switch (PTNKindOf(node)) {
+                case PTNKind::kSubTree:
+                    pending.push_back(static_cast<const PTNSubTree*>(node));
+                    break;
+                case PTNKind::kString: {
+                    const char* value = static_cast<PTNString*>(node)->GetValue();
+                    expands |= value && ExpandsOnReading(value);
+                    break;
                 }
-            } else if (auto* data = dynamic_cast<PTNBase64*>(node)) {
-                // Copies decode and encode afresh.
-                char* text = data->GetAsString();
-                unsigned length = 0;
-                unsigned char* bytes = data->Decode(nullptr, &length);
-                found.rawBase64 |= base64_encode(bytes, length) != text;
-                free(bytes);
-                free(text);
+                case PTNKind::kStringList:
+                    for (char** entry = static_cast<PTNStringList*>(node)->GetValue();
+                         entry && *entry; ++entry) {
+                        expands |= ExpandsOnReading(*entry);
+                    }
+                    break;
+                case PTNKind::kBase64: {
+                    // Copies decode and encode afresh.
+                    auto* data = static_cast<PTNBase64*>(node);
+                    HeapText text(data->GetAsString());
+                    unsigned length = 0;
+                    HeapPtr<unsigned char> bytes(data->Decode(nullptr, &length));
+                    found.rawBase64 |= base64_encode(bytes.get(), length) != text.get();
+                    break;
+                }
+                default:
+                    break;
             }
         }
     }

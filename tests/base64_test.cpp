@@ -4,6 +4,7 @@
 
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
+#include <services/rtprim.h>
 
 #include <ctype.h>
 #include <stdint.h>
@@ -45,7 +46,7 @@ std::string PiecewiseDecode(const std::string& text) {
 
 std::string Decoded(const PTNBase64& node, const char* text = nullptr) {
     unsigned int length = 12345;
-    std::unique_ptr<unsigned char, decltype(&free)> bytes(node.Decode(text, &length), free);
+    HeapPtr<unsigned char> bytes(node.Decode(text, &length));
     EXPECT_NE(bytes, nullptr);
     return std::string(reinterpret_cast<char*>(bytes.get()), length);
 }

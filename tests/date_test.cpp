@@ -1,3 +1,5 @@
+#include "report_capture.h"
+
 #include <dwxcore/dwxdate.h>
 #include <services/rtprim.h>
 #include <services/utilhub.h>
@@ -16,19 +18,18 @@ namespace {
 
 using Texts = std::vector<std::string>;
 
-Texts gReports;
-void Capture(int code, int severity, const char* message) {
-    gReports.push_back(code == 100 && severity == 0 ? message : "unexpected code or severity");
-}
-
 // Collects the date's reports while in scope.
 struct Reports {
-    IMPErrorHandler previous = IMPSetErrorHandler(&Capture);
-    ~Reports() {
-        IMPSetErrorHandler(previous);
-        gReports.clear();
+    ReportCapture capture;
+    Texts Take() {
+        Texts texts;
+        for (const CapturedReport& report : capture.Take()) {
+            texts.push_back(report.code == 100 && report.severity == 0
+                                ? report.message
+                                : "unexpected code or severity");
+        }
+        return texts;
     }
-    Texts Take() { return std::exchange(gReports, {}); }
 };
 
 std::string Invalid(const char* field, int m, int d, int y) {

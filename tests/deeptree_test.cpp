@@ -5,6 +5,7 @@
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
 #include <pthread.h>
+#include <services/rtprim.h>
 #include <services/utilhub.h>
 
 #include <stdlib.h>
@@ -102,10 +103,10 @@ TEST(DeepTreeTest, WritingUsesNoStackPerLevel) {
         written = Captured([&](FILE* f) { tree->WriteToFile(f); });
         char** list = tree->GetAsStringList(0);
         lines = static_cast<size_t>(CountStringList(list));
-        std::unique_ptr<char, decltype(&free)> join(StringListToBuffer(list), free);
+        HeapText join(StringListToBuffer(list));
         joined = join.get();
         DestroyStringList(list);
-        std::unique_ptr<char, decltype(&free)> whole(tree->GetAsString(), free);
+        HeapText whole(tree->GetAsString());
         text = whole.get();
     });
     // Per level an opening line of 2L + 10 characters and a closing line of

@@ -1,6 +1,7 @@
 // Reading the text form into trees: line kinds, keywords, the ')' cut, line
 // numbers in reports, errors inside and outside subtrees, includes, and
 // write-then-read round trips. Files live in a fresh temp directory.
+#include "report_capture.h"
 #include "scratch_dir.h"
 #include "tree_test_util.h"
 
@@ -27,24 +28,14 @@
 namespace {
 
 using Texts = std::vector<std::string>;
-Texts gReports;  // "code/severity message"
-void Capture(int code, int severity, const char* message) {
-    gReports.push_back(std::to_string(code) + "/" + std::to_string(severity) + " " +
-                       (message ? message : ""));
-}
 
 class ReaderTest : public ::testing::Test {
   protected:
-    void SetUp() override {
-        gReports.clear();
-        oPrevious = IMPSetErrorHandler(Capture);
-    }
     void TearDown() override {
-        IMPSetErrorHandler(oPrevious);
         unsetenv(DWX_ETC_PATH_VARIABLE);
         unsetenv(DWX_PRO_PATH_VARIABLE);
     }
-    IMPErrorHandler oPrevious = nullptr;
+    ReportCapture oCapture;  // "code/severity message"
     ScratchDir oDir;
 };
 
@@ -107,7 +98,7 @@ TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
         std::string node = *row.node ? name + ":" + row.node + " " : "";
         EXPECT_EQ(Shape(tree.get(), true), node + "after:PTNInteger=1") << row.line;
     }
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Texts().empty());
     // A true Bool is stored as 1, and an empty StringList is a list without entries.
     auto tree = Read("(b Bool TRUE)\n(l StringList )\n");
     EXPECT_EQ(tree->GetChildAsBool("b"), 1);
@@ -144,14 +135,15 @@ TEST_F(ReaderTest, CorruptLineOutsideSubtreesReachesHost) {
     // Comments and blank lines count: the bad line is always line 5. The
     // cut takes a ')' after a tab, leaving no token.
     for (const char* line : {"(n String)", "n Integer 1", "(n)", "(n Integer)", "\t)"}) {
-        gReports.clear();
+        oCapture.Clear();
         PTNSubTree tree("root");
         EXPECT_THROW(tree.BuildFromString((std::string("! c\n(a Integer 1)\n\n   # c\n") + line +
                                            "\n(b Integer 2)\n")
                                               .c_str()),
                      tzn::Exception);
         EXPECT_EQ(Shape(&tree), "a") << line;
-        EXPECT_EQ(gReports, Texts{"-1/1 Corrupt file Memory\n at line 5 ... missing tokens.\n"});
+        EXPECT_EQ(oCapture.Texts(),
+                  Texts{"-1/1 Corrupt file Memory\n at line 5 ... missing tokens.\n"});
     }
 }
 
@@ -160,7 +152,8 @@ TEST_F(ReaderTest, CorruptLineInsideSubtreeStopsQuietly) {
         "(a Integer 1)\n(s SubTree\n  (b Integer 2)\n  (t SubTree\n    (c Integer 3)\n"
         "    (bad String)\n    (d Integer 4)\n  )\n  (e Integer 5)\n)\n(f Integer 6)\n";
     EXPECT_EQ(Shape(Read(text).get()), "a s{b t{c}}");  // no exception
-    EXPECT_EQ(gReports, Texts{"-1/1 Corrupt file Memory\n at line 6 ... missing tokens.\n"});
+    EXPECT_EQ(oCapture.Texts(),
+              Texts{"-1/1 Corrupt file Memory\n at line 6 ... missing tokens.\n"});
 
     // Through AddChildrenFromStringList: null position, and the count that
     // the level holding the failed subtree had reached when it opened it.
@@ -169,7 +162,8 @@ TEST_F(ReaderTest, CorruptLineInsideSubtreeStopsQuietly) {
     int counter = 10;
     EXPECT_EQ(other.AddChildrenFromStringList(lines, "f.cfg", &counter), nullptr);
     EXPECT_EQ(counter, 14);
-    EXPECT_EQ(gReports.back(), "-1/1 Corrupt file f.cfg\n at line 16 ... missing tokens.\n");
+    EXPECT_EQ(oCapture.Texts().back(),
+              "-1/1 Corrupt file f.cfg\n at line 16 ... missing tokens.\n");
     DestroyStringList(lines);
 }
 
@@ -201,7 +195,7 @@ TEST_F(ReaderTest, LevelsPositionsAndCounter) {
     PTNSubTree empty("root");
     empty.BuildFromString(nullptr);
     EXPECT_EQ(Shape(&empty) + Shape(Read("").get()), "");
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Texts().empty());
 }
 
 TEST_F(ReaderTest, CommentLinesAndTreeStart) {
@@ -238,15 +232,15 @@ TEST_F(ReaderTest, ForeignStreams) {
 }
 
 // Everything a read leaves: the exception, the reports and the tree.
-std::string Outcome(PTNSubTree& tree, const std::function<void()>& read) {
-    gReports.clear();
+std::string Outcome(ReportCapture& capture, PTNSubTree& tree, const std::function<void()>& read) {
+    capture.Clear();
     std::string outcome;
     try {
         read();
     } catch (const tzn::Exception& e) {
         outcome = std::string("exception: ") + e.what() + "\n";
     }
-    for (const std::string& report : gReports) {
+    for (const std::string& report : capture.Texts()) {
         outcome += report + "\n";
     }
     return outcome + Shape(&tree, true);
@@ -277,19 +271,21 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
     for (const std::string& text : texts) {
         std::string path = oDir.Write("case.cfg", text);
         PTNSubTree inPlace("root"), fromList("root"), fromBuffer("root");
-        std::string expected = Outcome(fromList, [&] {
+        std::string expected = Outcome(oCapture, fromList, [&] {
             std::unique_ptr<char*, void (*)(char**)> lines(TextFileToStringList(path.c_str()),
                                                            DestroyStringList);
             int counter = 0;
             fromList.AddChildrenFromStringList(lines.get(), path.c_str(), &counter);
         });
-        EXPECT_EQ(Outcome(inPlace, [&] { ReadFile(inPlace, path); }), expected) << text.size();
+        EXPECT_EQ(Outcome(oCapture, inPlace, [&] { ReadFile(inPlace, path); }), expected)
+            << text.size();
         if (text.find('\0') == std::string::npos) {
             for (size_t at; (at = expected.find(path)) != std::string::npos;) {
                 expected.replace(at, path.size(), "Memory");
             }
-            EXPECT_EQ(Outcome(fromBuffer, [&] { fromBuffer.BuildFromString(text.c_str()); }),
-                      expected);
+            EXPECT_EQ(
+                Outcome(oCapture, fromBuffer, [&] { fromBuffer.BuildFromString(text.c_str()); }),
+                expected);
         }
     }
 }
@@ -302,7 +298,7 @@ TEST_F(ReaderTest, IncludesPlaceNodesAndCountOwnLines) {
                                               ")\n(s SubTree\n  (@Include " + inc +
                                               ")\n  (y Integer 2)\n)\n(b Integer 3)\n"));
     EXPECT_EQ(Shape(&tree), "a x s{x y} b");
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Texts().empty());
 
     // A corrupt line at the outermost level of an included file reaches the
     // host when the directive is outside every subtree, naming that file...
@@ -311,7 +307,8 @@ TEST_F(ReaderTest, IncludesPlaceNodesAndCountOwnLines) {
                                                             ")\n(b Integer 2)\n")),
                  tzn::Exception);
     EXPECT_EQ(Shape(&failed), "a");
-    EXPECT_EQ(gReports, Texts{"-1/1 Corrupt file " + bad + "\n at line 3 ... missing tokens.\n"});
+    EXPECT_EQ(oCapture.Texts(),
+              Texts{"-1/1 Corrupt file " + bad + "\n at line 3 ... missing tokens.\n"});
     // ...and stops the read quietly when it is inside one.
     PTNSubTree quiet("root");
     ReadFile(quiet, oDir.Write("nested.cfg", "(s SubTree\n(@include " + bad +
@@ -328,9 +325,9 @@ TEST_F(ReaderTest, MissingIncludesAndSearchPath) {
         "(a Integer 1)\n! c\n(@include $READER_TEST_DIR/none.cfg)\n"
         "(@TRY_INCLUDE ${READER_TEST_DIR}/none.cfg)\n(b Integer 2)\n");
     EXPECT_EQ(Shape(tree.get()), "a b");
-    EXPECT_EQ(gReports, Texts{"3/2 Unable to locate file '" + oDir.Path("none.cfg") +
-                              "'\nrequested in @include directive\non line 3 of file "
-                              "'Memory'.\nIgnoring.\n"});
+    EXPECT_EQ(oCapture.Texts(), Texts{"3/2 Unable to locate file '" + oDir.Path("none.cfg") +
+                                      "'\nrequested in @include directive\non line 3 of file "
+                                      "'Memory'.\nIgnoring.\n"});
 
     // Relative names are searched in the "etc" list first, then "pro".
     oDir.Write("etc/both.cfg", "(fromEtc Integer 1)\n");
@@ -339,7 +336,7 @@ TEST_F(ReaderTest, MissingIncludesAndSearchPath) {
     setenv(DWX_ETC_PATH_VARIABLE, oDir.Path("etc").c_str(), 1);
     setenv(DWX_PRO_PATH_VARIABLE, oDir.Path("pro").c_str(), 1);
     EXPECT_EQ(Shape(Read("(@include both.cfg)\n(@include only.cfg)\n").get()), "fromEtc onlyPro");
-    EXPECT_EQ(gReports.size(), 1u);
+    EXPECT_EQ(oCapture.Texts().size(), 1u);
 }
 
 // Diamonds and longer cycles are in the robustness tests.
@@ -349,9 +346,9 @@ TEST_F(ReaderTest, IncludeCycleAndDepthLimit) {
     ReadFile(tree,
              oDir.Write("self.cfg", "(s Integer 1)\n(@include " + self + ")\n(t Integer 2)\n"));
     EXPECT_EQ(Shape(&tree), "s t");
-    EXPECT_EQ(gReports, Texts{"3/2 Include cycle: file '" + self +
-                              "'\nrequested in @include directive\non line 2 of file '" + self +
-                              "'\nis already being read.\nIgnoring.\n"});
+    EXPECT_EQ(oCapture.Texts(), Texts{"3/2 Include cycle: file '" + self +
+                                      "'\nrequested in @include directive\non line 2 of file '" +
+                                      self + "'\nis already being read.\nIgnoring.\n"});
 
     // A chain of 70 distinct files: 64 nested includes are read.
     auto chain = [](int i) { return "chain" + std::to_string(i) + ".cfg"; };
@@ -359,15 +356,15 @@ TEST_F(ReaderTest, IncludeCycleAndDepthLimit) {
         oDir.Write(chain(i), "(n" + std::to_string(i) + " Integer 1)\n(@include " +
                                  oDir.Path(chain(i + 1)) + ")\n");
     }
-    gReports.clear();
+    oCapture.Clear();
     PTNSubTree deep("root");
     ReadFile(deep, oDir.Path(chain(0)));
     EXPECT_EQ(deep.GetChildren()->GetCount(), 65);
     EXPECT_NE(deep.GetChild("n64"), nullptr);
-    ASSERT_EQ(gReports.size(), 1u);
-    EXPECT_EQ(
-        gReports[0].find("3/2 Include depth limit of 64 reached: file '" + oDir.Path(chain(65))),
-        0u);
+    ASSERT_EQ(oCapture.Texts().size(), 1u);
+    EXPECT_EQ(oCapture.Texts()[0].find("3/2 Include depth limit of 64 reached: file '" +
+                                       oDir.Path(chain(65))),
+              0u);
 }
 
 // The null device, under any name, switches an include off silently; every
@@ -387,14 +384,16 @@ TEST_F(ReaderTest, NullDeviceIsAnEmptyIncludeOtherSpecialFilesAreMissing) {
     };
     for (const Row& row : rows) {
         for (const char* directive : {"@include", "@try_include"}) {
-            gReports.clear();
+            oCapture.Clear();
             auto tree = Read("(a Integer 1)\n(" + std::string(directive) + " " + row.target +
                              ")\n(b Integer 2)\n");
             EXPECT_EQ(Shape(tree.get()), "a b") << row.target;
             bool reported = row.missing && directive[1] == 'i';
-            ASSERT_EQ(gReports.size(), reported ? 1u : 0u) << directive << " " << row.target;
+            ASSERT_EQ(oCapture.Texts().size(), reported ? 1u : 0u)
+                << directive << " " << row.target;
             if (reported) {
-                EXPECT_EQ(gReports[0].find("3/2 Unable to locate file '" + row.target + "'"), 0u);
+                EXPECT_EQ(
+                    oCapture.Texts()[0].find("3/2 Unable to locate file '" + row.target + "'"), 0u);
             }
         }
     }
@@ -440,29 +439,29 @@ TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
     tree.BuildFromFile(stream);
     fclose(stream);
     EXPECT_EQ(Shape(&tree, true), "a:PTNInteger=1 s{b:PTNInteger=2}");
-    EXPECT_EQ(gReports, Texts{report("Memory", 3)});
+    EXPECT_EQ(oCapture.Texts(), Texts{report("Memory", 3)});
 
     // The kernel refuses to read the first page of a process's memory: a
     // real error on a file that passes every check. Through an include, and
     // as the file the reading starts from.
-    gReports.clear();
+    oCapture.Clear();
     auto included = Read("(a Integer 1)\n(@include /proc/self/mem)\n(b Integer 2)\n");
     EXPECT_EQ(Shape(included.get()), "a b");
-    EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
-    gReports.clear();
+    EXPECT_EQ(oCapture.Texts(), Texts{report("/proc/self/mem", 0)});
+    oCapture.Clear();
     PTNSubTree whole("root");
     ReadFile(whole, "/proc/self/mem");
-    EXPECT_EQ(gReports, Texts{report("/proc/self/mem", 0)});
+    EXPECT_EQ(oCapture.Texts(), Texts{report("/proc/self/mem", 0)});
 
     // With a read log the report goes there, with its place, and nowhere else.
-    gReports.clear();
+    oCapture.Clear();
     FailingSource again{text, text.find("5)")};
     stream = OpenFailing(again);
     PTNSubTree logged("root");
     PTNReadLog log;
     logged.BuildFromFile(stream, &log);
     fclose(stream);
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Texts().empty());
     ASSERT_EQ(log.Reports().size(), 1u);
     EXPECT_EQ(log.Reports()[0].code, 3);
     EXPECT_EQ(log.Reports()[0].file, "Memory");
@@ -529,7 +528,7 @@ TEST_F(ReaderTest, WriteThenReadEveryClass) {
         R"(sl:PTNStringList="x" "y z" "" esl:PTNStringList= dl:PTNDoubleList=1.5 -2.25 1e+300 )"
         R"(edl:PTNDoubleList= b64:PTNBase64=AP9hCg== zero:PTNChar=) blank:PTNChar=) )"
         R"(inner{deep:PTNInteger=7 empty{}}})");
-    ASSERT_EQ(gReports.size(), 1u);  // the tab line
+    ASSERT_EQ(oCapture.Texts().size(), 1u);  // the tab line
 }
 
 // Reads with a log ----------------------------------------------------------
@@ -590,7 +589,7 @@ TEST_F(ReaderTest, LogTakesReportsAndWarningsWithTheirLines) {
         PTNSubTree logged("root"), plain("root");
         PTNReadLog log;
         EXPECT_NO_THROW(logged.BuildFromString(row.text, &log));
-        EXPECT_TRUE(gReports.empty());
+        EXPECT_TRUE(oCapture.Texts().empty());
         EXPECT_EQ(Entries(log.Reports()), row.reports);
         EXPECT_EQ(Entries(log.Warnings()), row.warnings);
         EXPECT_EQ(log.Ok(), row.reports.empty());
@@ -599,9 +598,9 @@ TEST_F(ReaderTest, LogTakesReportsAndWarningsWithTheirLines) {
             plain.BuildFromString(row.text, nullptr);
         } catch (const tzn::Exception&) {
         }
-        EXPECT_EQ(gReports.size(), row.reports.size());
+        EXPECT_EQ(oCapture.Texts().size(), row.reports.size());
         EXPECT_EQ(Shape(&logged, true), Shape(&plain, true));
-        gReports.clear();
+        oCapture.Clear();
     }
 }
 
@@ -618,7 +617,7 @@ TEST_F(ReaderTest, LogNamesIncludedFilesAndTheirOwnLines) {
               (Texts{"-1/1 " + inc + ":4", "3/2 " + main + ":3", "-1/1 " + inc + ":4"}));
     EXPECT_EQ(Entries(log.Warnings()), (Texts{"101/3 " + inc + ":2", "101/3 " + inc + ":2"}));
     EXPECT_EQ(log.Files(), (Texts{main, inc}));  // once each, the starting file first
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Texts().empty());
 }
 
 TEST_F(ReaderTest, SourcesThroughIncludesCopiesMergesAndRereads) {

@@ -2,6 +2,7 @@
 // missing files; a 1 MB line, a million siblings and nesting far deeper than
 // any configuration. Whatever happens is reported through the error handler,
 // everything read before a problem stays, and nothing crashes.
+#include "report_capture.h"
 #include "scratch_dir.h"
 #include "tree_test_util.h"
 
@@ -22,25 +23,9 @@
 
 namespace {
 
-struct Report {
-    int code;
-    int severity;
-    std::string message;
-};
-std::vector<Report> gReports;
-void Capture(int code, int severity, const char* message) {
-    gReports.push_back({code, severity, message ? message : ""});
-}
-
 class RobustnessTest : public ::testing::Test {
   protected:
-    void SetUp() override {
-        gReports.clear();
-        oPrevious = IMPSetErrorHandler(Capture);
-    }
-    void TearDown() override { IMPSetErrorHandler(oPrevious); }
-
-    IMPErrorHandler oPrevious = nullptr;
+    ReportCapture oCapture;
     ScratchDir oDir;
 };
 
@@ -91,15 +76,15 @@ TEST_F(RobustnessTest, IncludeChainOfAHundredFiles) {
     }
     EXPECT_EQ(Shape(&tree), expected);
     if (read == files) {
-        EXPECT_TRUE(gReports.empty());
+        EXPECT_TRUE(oCapture.Reports().empty());
     } else {
         EXPECT_GE(read, 50);
-        ASSERT_EQ(gReports.size(), 1u);
-        EXPECT_EQ(gReports[0].code, 3);
-        EXPECT_EQ(gReports[0].severity, 2);
-        EXPECT_NE(gReports[0].message.find("chain" + std::to_string(read) + ".cfg'"),
+        ASSERT_EQ(oCapture.Reports().size(), 1u);
+        EXPECT_EQ(oCapture.Reports()[0].code, 3);
+        EXPECT_EQ(oCapture.Reports()[0].severity, 2);
+        EXPECT_NE(oCapture.Reports()[0].message.find("chain" + std::to_string(read) + ".cfg'"),
                   std::string::npos)
-            << gReports[0].message;
+            << oCapture.Reports()[0].message;
     }
 }
 
@@ -184,19 +169,19 @@ TEST_F(RobustnessTest, IncludeCyclesDiamondsAndMissingFiles) {
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
-        gReports.clear();
+        oCapture.Clear();
         for (const auto& file : c.files) {
             oDir.Write(file.first + ".cfg", resolve(file.second));
         }
         PTNSubTree tree("root");
         ReadFile(tree, oDir.Path(std::string(c.start) + ".cfg"));
         EXPECT_EQ(Shape(&tree), c.shape);
-        ASSERT_EQ(gReports.size(), c.reports.size());
+        ASSERT_EQ(oCapture.Reports().size(), c.reports.size());
         for (size_t i = 0; i < c.reports.size(); ++i) {
-            EXPECT_EQ(gReports[i].code, 3);
-            EXPECT_EQ(gReports[i].severity, 2);
-            EXPECT_NE(gReports[i].message.find(resolve(c.reports[i])), std::string::npos)
-                << gReports[i].message;
+            EXPECT_EQ(oCapture.Reports()[i].code, 3);
+            EXPECT_EQ(oCapture.Reports()[i].severity, 2);
+            EXPECT_NE(oCapture.Reports()[i].message.find(resolve(c.reports[i])), std::string::npos)
+                << oCapture.Reports()[i].message;
         }
         oDir.Clear();
     }
@@ -226,7 +211,7 @@ TEST_F(RobustnessTest, MegabyteLine) {
     auto* root = dynamic_cast<PTNSubTree*>(again.GetChild("root"));
     ASSERT_NE(root, nullptr);
     EXPECT_EQ(root->GetChildAsString("big"), value);
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Reports().empty());
 
     // A 1 MB line that is no node line is a corrupt line like any other.
     std::string junk(1u << 20, 'x');
@@ -234,8 +219,8 @@ TEST_F(RobustnessTest, MegabyteLine) {
     PTNSubTree bad("bad");
     EXPECT_THROW(bad.BuildFromString(junk.c_str()), tzn::Exception);
     EXPECT_EQ(Shape(&bad), "ok");
-    ASSERT_EQ(gReports.size(), 1u);
-    EXPECT_NE(gReports[0].message.find("at line 2"), std::string::npos);
+    ASSERT_EQ(oCapture.Reports().size(), 1u);
+    EXPECT_NE(oCapture.Reports()[0].message.find("at line 2"), std::string::npos);
 }
 
 TEST_F(RobustnessTest, AMillionSiblings) {
@@ -251,7 +236,7 @@ TEST_F(RobustnessTest, AMillionSiblings) {
 
     PTNSubTree tree("root");
     tree.BuildFromString(text.c_str());
-    EXPECT_TRUE(gReports.empty());
+    EXPECT_TRUE(oCapture.Reports().empty());
     auto* big = dynamic_cast<PTNSubTree*>(tree.GetChild("big"));
     ASSERT_NE(big, nullptr);
     ASSERT_EQ(big->GetChildren()->GetCount(), count);
@@ -286,7 +271,7 @@ TEST_F(RobustnessTest, NestingFarTooDeep) {
     EXPECT_EQ(tree.GetChildAsInteger("first"), 1);
     const int depth = Depth(&tree);
     if (depth == levels) {
-        EXPECT_TRUE(gReports.empty());
+        EXPECT_TRUE(oCapture.Reports().empty());
         EXPECT_EQ(tree.GetChildAsInteger("after"), 2);
         // Writing is left out: the indentation alone would be about 20 GB.
         std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
@@ -295,12 +280,13 @@ TEST_F(RobustnessTest, NestingFarTooDeep) {
         return;
     }
     EXPECT_GE(depth, 256);
-    ASSERT_EQ(gReports.size(), 1u);
-    EXPECT_EQ(gReports[0].code, -1);
-    EXPECT_EQ(gReports[0].severity, 1);
+    ASSERT_EQ(oCapture.Reports().size(), 1u);
+    EXPECT_EQ(oCapture.Reports()[0].code, -1);
+    EXPECT_EQ(oCapture.Reports()[0].severity, 1);
     // The first subtree left out opens line depth + 2.
-    EXPECT_NE(gReports[0].message.find("at line " + std::to_string(depth + 2)), std::string::npos)
-        << gReports[0].message;
+    EXPECT_NE(oCapture.Reports()[0].message.find("at line " + std::to_string(depth + 2)),
+              std::string::npos)
+        << oCapture.Reports()[0].message;
     EXPECT_EQ(tree.GetChild("after"), nullptr);
 
     // The kept levels survive a write and a read back, and a deep copy.
@@ -313,7 +299,7 @@ TEST_F(RobustnessTest, NestingFarTooDeep) {
     EXPECT_EQ(Depth(&again), depth);
     std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
     EXPECT_EQ(Depth(copy.get()), depth);
-    EXPECT_EQ(gReports.size(), 1u);
+    EXPECT_EQ(oCapture.Reports().size(), 1u);
 }
 
 }  // namespace

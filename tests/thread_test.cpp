@@ -3,6 +3,7 @@
 // lazily made process-wide tables (named colours, the current-object
 // registry, the exit list) made by those threads together. The tsan preset
 // runs this under ThreadSanitizer; the answers are checked on every build.
+#include "report_capture.h"
 #include "scratch_dir.h"
 #include "tree_test_util.h"
 
@@ -36,11 +37,6 @@ class Item : public DWXObject {
     const char* GetClassName() const override { return "Item"; }
     int nValue;
 };
-
-std::atomic<int> gReports{0};
-void CountReport(int, int, const char*) {
-    ++gReports;
-}
 
 // One round of every family on thread `id`; the names of the checks that failed.
 std::string Round(int id, const std::string& file) {
@@ -123,9 +119,9 @@ TEST(ThreadTest, SeparateObjectsOnSeparateThreads) {
     const int rounds = getenv("DWXCORE_UNDER_VALGRIND") ? 3 : 40;
     ScratchDir dir;
     std::string common = dir.Write("common.cfg", "(common SubTree\n  (shared Integer 1)\n)\n");
-    IMPErrorHandler previous = IMPSetErrorHandler(CountReport);
+    auto capture = std::make_unique<ReportCapture>();
     DWXDate(13, 1, 2000);  // the reports of one invalid date
-    const int reportsPerDate = gReports.exchange(0);
+    const int reportsPerDate = static_cast<int>(capture->Take().size());
     // Includes are traced, to a stream that every thread writes to.
     FILE* trace = tmpfile();
     FILE* previousTrace = tzn::tracer::Debugger::SetStream(trace);
@@ -161,13 +157,15 @@ TEST(ThreadTest, SeparateObjectsOnSeparateThreads) {
     tzn::tracer::Debugger::moDebugLevel = 0;
     tzn::tracer::Debugger::SetStream(previousTrace == stderr ? nullptr : previousTrace);
     fclose(trace);
-    IMPSetErrorHandler(previous);
+    const size_t reports = capture->Reports().size();
+    capture.reset();
 
     for (int id = 0; id < kThreads; ++id) {
         EXPECT_EQ(failures[id], "") << "thread " << id;
         EXPECT_EQ(singletons[id], singletons[0]) << "thread " << id;
     }
-    EXPECT_EQ(gReports.load(), kThreads * rounds * reportsPerDate);  // every report arrives
+    EXPECT_EQ(reports,
+              static_cast<size_t>(kThreads * rounds * reportsPerDate));  // every report arrives
 }
 
 }  // namespace

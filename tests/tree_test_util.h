@@ -3,6 +3,7 @@
 #pragma once
 
 #include <dwxcore/dwxparse.h>
+#include <services/rtprim.h>
 #include <services/utilhub.h>
 
 #include <gtest/gtest.h>
@@ -15,7 +16,7 @@
 
 // The value of `node` as GetAsString gives it; "(null)" when it gives none.
 inline std::string Text(const DWXParseTreeNode& node) {
-    std::unique_ptr<char, decltype(&free)> text(node.GetAsString(), free);
+    HeapText text(node.GetAsString());
     return text ? text.get() : "(null)";
 }
 

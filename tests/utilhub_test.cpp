@@ -1,3 +1,4 @@
+#include "report_capture.h"
 #include "scratch_dir.h"
 
 #include <services/utilhub.h>
@@ -356,14 +357,9 @@ TEST(UtilhubText, TodayAsDayMonthYear) {
     EXPECT_STREQ(IMPTime(nullptr, 10), expected);
 }
 
-std::vector<std::string> gReports;
-void Capture(int code, int severity, const char* message) {
-    gReports.push_back(std::to_string(code) + "/" + std::to_string(severity) + " " + message);
-}
-
 TEST(UtilhubReport, HandlerSeesEveryReportAndSeverityOneThrows) {
-    IMPErrorHandler previous = IMPSetErrorHandler(Capture);
-    EXPECT_NE(previous, nullptr);  // the default handler
+    ReportCapture capture;
+    EXPECT_NE(capture.Previous(), nullptr);  // the default handler
     IMPError(100, 0, "bad date");
     IMPError(3, 2, nullptr);
     try {
@@ -375,11 +371,11 @@ TEST(UtilhubReport, HandlerSeesEveryReportAndSeverityOneThrows) {
         EXPECT_STREQ(e.what(), "Corrupt file x\n at line 5");
     }
     // The handler saw the last report before the throw.
-    EXPECT_EQ(gReports, (std::vector<std::string>{"100/0 bad date", "3/2 ",
-                                                  "-1/1 Corrupt file x\n at line 5"}));
+    EXPECT_EQ(capture.Texts(), (std::vector<std::string>{"100/0 bad date", "3/2 ",
+                                                         "-1/1 Corrupt file x\n at line 5"}));
 
     // The default handler writes one line.
-    EXPECT_EQ(IMPSetErrorHandler(nullptr), Capture);
+    EXPECT_EQ(IMPSetErrorHandler(nullptr), ReportCapture::Handler());
     testing::internal::CaptureStderr();
     IMPError(7, 2, "first\nsecond\n");
     std::string written = testing::internal::GetCapturedStderr();

@@ -9,6 +9,7 @@
 
 #include <stdio.h>
 #include <stdlib.h>
+#include <string.h>
 
 #include <memory>
 #include <string>
@@ -120,6 +121,58 @@ TEST(WriterTest, HostSubclassesRenderThemselves) {
               "  (folder SUBTREE|    (nl Char \n)|  )|)|");
 }
 
+// Each kind: the class PTNKindOf names, the keyword its line carries, and
+// whether reading that line builds the same kind again (Float and the
+// integer lists are written but never read).
+TEST(WriterTest, KindsKeywordsAndReadingAgree) {
+    const int ints[] = {1, 2};
+    const double doubles[] = {0.5};
+    char entry[] = "a";
+    char* strings[] = {entry, nullptr};
+    const unsigned char bytes[] = {1, 2, 3};
+    const struct {
+        DWXParseTreeNode* node;
+        PTNKind kind;
+        const char* keyword;
+        bool read;
+    } rows[] = {
+        {new PTNSubTree("n"), PTNKind::kSubTree, "SubTree", true},
+        {new PTNString("n", "v"), PTNKind::kString, "String", true},
+        {new PTNStringList("n", strings), PTNKind::kStringList, "StringList", true},
+        {new PTNInteger("n", 7), PTNKind::kInteger, "Integer", true},
+        {new PTNChar("n", 'c'), PTNKind::kChar, "Char", true},
+        {new PTNBool("n", 1), PTNKind::kBool, "Bool", true},
+        {new PTNFloat("n", 1.5f), PTNKind::kFloat, "Float", false},
+        {new PTNDouble("n", 2.5), PTNKind::kDouble, "Double", true},
+        {new PTNDoubleList("n", 1, doubles), PTNKind::kDoubleList, "DoubleList", true},
+        {new PTNIntegerList("n", 2, ints), PTNKind::kIntegerList, "IntegerList", false},
+        {new PTNInteger32List("n", 2, ints), PTNKind::kInteger32List, "Integer32List", false},
+        {new PTNBase64("n", bytes, 3u), PTNKind::kBase64, "Base64", true},
+    };
+    for (const auto& row : rows) {
+        PTNSubTree tree("t");
+        tree.AddChild(row.node);
+        EXPECT_EQ(PTNKindOf(row.node), row.kind) << row.keyword;
+        EXPECT_STREQ(PTNTypeKeyword(row.node->GetClassName()), row.keyword);
+        HeapText text(tree.GetAsString());
+        EXPECT_NE(strstr(text.get(), (std::string("(n ") + row.keyword).c_str()), nullptr)
+            << text.get();
+        PTNSubTree back("b");
+        back.BuildFromString(text.get());
+        DWXParseTreeNode* again = back.Find("t/n");
+        EXPECT_EQ(again != nullptr, row.read) << row.keyword;
+        if (again != nullptr) {
+            EXPECT_EQ(PTNKindOf(again), row.kind) << row.keyword;
+        }
+    }
+    // A host's subclass is no kind of the library's, whatever its name says.
+    Folder folder;
+    EXPECT_EQ(PTNKindOf(&folder), PTNKind::kOther);
+    EXPECT_EQ(PTNKindOf(nullptr), PTNKind::kOther);
+    EXPECT_STREQ(PTNTypeKeyword(nullptr), "");
+    EXPECT_STREQ(PTNTypeKeyword("Ab"), "Ab");
+}
+
 // A file receives the text in blocks; what arrives is the text, whatever the
 // sizes of the lines and of the whole.
 TEST(WriterTest, LargeTreesReachTheFileWhole) {
@@ -133,7 +186,7 @@ TEST(WriterTest, LargeTreesReachTheFileWhole) {
     }
     tree.AddChild(new PTNString("huge", std::string(200000, 'h').c_str()));
     char** list = tree.GetAsStringList(0);
-    std::unique_ptr<char, decltype(&free)> joined(StringListToBuffer(list), free);
+    HeapText joined(StringListToBuffer(list));
     EXPECT_EQ(CountStringList(list), 3 * 3000 + 2 + 3000 * 2 + 1);
     DestroyStringList(list);
     EXPECT_EQ(Captured([&](FILE* f) { tree.WriteToFile(f); }), joined.get());

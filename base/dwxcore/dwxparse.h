@@ -19,6 +19,7 @@
 #include <vector>
 
 class PTNSubTree;
+class DWXParseTreeNode;
 
 // Where a node was read from: a file as the reader opened it ("Memory" for a
 // buffer) and, for an included file, the file and line of the directive that
@@ -74,6 +75,32 @@ class PTNReadLog {
     std::vector<std::string> oFiles;
     std::vector<std::string> oCanonicalFiles;  // the same files by canonical path
 };
+
+// The node classes of the library, one for each type keyword of the text
+// format: SubTree for PTNSubTree, String for PTNString and so on.
+enum class PTNKind {
+    kSubTree,
+    kString,
+    kStringList,
+    kInteger,
+    kChar,
+    kBool,
+    kFloat,
+    kDouble,
+    kDoubleList,
+    kIntegerList,
+    kInteger32List,
+    kBase64,
+    kOther  // null, or any other class, a host's subclass of a library class included
+};
+
+// The kind of the exact class of `node`, as the writer dispatches on it.
+// O(number of kinds).
+DWXCORE_API PTNKind PTNKindOf(const DWXParseTreeNode* node);
+
+// The type keyword the writer writes for a class name: the name without its
+// first three characters (its "PTN"), the whole of a shorter name, "" for null.
+DWXCORE_API const char* PTNTypeKeyword(const char* className);
 
 // Base of every node: a name owned by the node and a borrowed pointer to the
 // subtree that holds it (null until the node is added to one).

@@ -32,7 +32,7 @@ char* PooledName(const char* name, size_t size) {
 }
 
 // A heap copy of the text that a Put function wrote into `buffer`.
-char* HeapText(char* buffer, char* end) {
+char* CopyToHeap(char* buffer, char* end) {
     *end = '\0';
     return HString(buffer);
 }
@@ -181,7 +181,7 @@ DWXParseTreeNode* PTNChar::Copy() {
 char* PTNChar::GetAsString() const {
     // "%c" of 0 writes the terminator itself, so 0 renders as the empty text.
     char text[2];
-    return HeapText(text, PutCharacter(text, cValue));
+    return CopyToHeap(text, PutCharacter(text, cValue));
 }
 
 void PTNChar::SetFrom(DWXParseTreeNode* other) {
@@ -210,7 +210,7 @@ DWXParseTreeNode* PTNInteger::Copy() {
 
 char* PTNInteger::GetAsString() const {
     char text[kNumberTextMax + 1];
-    return HeapText(text, PutInteger(text, nValue));
+    return CopyToHeap(text, PutInteger(text, nValue));
 }
 
 void PTNInteger::SetFrom(DWXParseTreeNode* other) {
@@ -239,7 +239,7 @@ DWXParseTreeNode* PTNFloat::Copy() {
 
 char* PTNFloat::GetAsString() const {
     char text[kNumberTextMax + 1];
-    return HeapText(text, PutFixed(text, static_cast<double>(fValue)));
+    return CopyToHeap(text, PutFixed(text, static_cast<double>(fValue)));
 }
 
 void PTNFloat::SetFrom(DWXParseTreeNode* other) {
@@ -268,7 +268,7 @@ DWXParseTreeNode* PTNDouble::Copy() {
 
 char* PTNDouble::GetAsString() const {
     char text[kNumberTextMax + 1];
-    return HeapText(text, PutShortest(text, dValue));
+    return CopyToHeap(text, PutShortest(text, dValue));
 }
 
 void PTNDouble::SetFrom(DWXParseTreeNode* other) {

@@ -11,6 +11,7 @@
 // includes recurse, bounded by the include depth limit.
 #include <dwxcore/dwxparse.h>
 
+#include "internal/dwxparse_kinds.h"
 #include "internal/dwxparse_scan.h"
 #include "internal/dwxparse_token.h"
 
@@ -32,37 +33,6 @@
 #include <unordered_map>
 #include <utility>
 #include <vector>
-
-// Builds String leaves around values the reader has already allocated or
-// unquotes into the leaf itself.
-struct PTNStringAdopter {
-    // Tokens shorter than this unquote to a value the leaf keeps in itself
-    // (unquoting never lengthens a token; only the expansions of values that
-    // begin with '@', 'M' or '_' may, and those the leaf copies as it needs).
-    static constexpr size_t kInline = PTNString::kShortValue;
-
-    // A new leaf with the value of `token`, shorter than kInline, unquoted
-    // straight into the leaf: the reader's String lines mostly take this way.
-    static PTNString* MakeShort(const char* name, const char* token) {
-        auto node = std::make_unique<PTNString>(name, nullptr);
-        if (dwxcore::internal::UnquoteTokenInto(token, node->acShortValue) != nullptr) {
-            node->pcValue = node->acShortValue;
-        } else {
-            node->SetValue(
-                dwxcore::internal::UnquoteToken(token).c_str());  // an expansion may apply
-        }
-        return node.release();
-    }
-
-    // A new leaf that owns `value` (a heap text), which is freed here if the
-    // leaf cannot be built.
-    static PTNString* Make(const char* name, char* value) {
-        std::unique_ptr<char, void (*)(void*)> owned(value, free);
-        PTNString* node = new PTNString(name, nullptr);
-        node->pcValue = owned.release();
-        return node;
-    }
-};
 
 // Appends the nodes the reader makes: new nodes, without a parent, that need
 // none of AddChild's checks.
@@ -110,19 +80,14 @@ namespace {
 // Nested includes allowed below the file the reading started from.
 constexpr int kMaxIncludeDepth = 64;
 
-struct FreeDeleter {
-    void operator()(char* text) const { free(text); }
-};
-using HeapText = std::unique_ptr<char, FreeDeleter>;
-
-using dwxcore::internal::BeginsWith;
+using dwxcore::internal::ClassifyKeyword;
 using dwxcore::internal::ClassOf;
+using dwxcore::internal::IsIncludeDirective;
 using dwxcore::internal::IsWhite;
-using dwxcore::internal::MakeKeyword;
-using dwxcore::internal::Matches;
+using dwxcore::internal::KindEntry;
+using dwxcore::internal::LeafTokens;
 using dwxcore::internal::ScanDouble;
 using dwxcore::internal::ScanInteger;
-using dwxcore::internal::UnquoteTokenToHeap;
 
 const char* SourceName(const char* fileName) {
     return fileName ? fileName : "Memory";
@@ -162,80 +127,6 @@ class SourceTable {
 const PTNSourceFile* InternSource(const char* fileName, const PTNSourceFile* includedBy, int line) {
     static SourceTable* table = new SourceTable;
     return table->Intern(SourceName(fileName), includedBy, line);
-}
-
-// The type keywords the reader builds nodes for.
-enum class Keyword {
-    SubTree,
-    String,
-    StringList,
-    Integer,
-    Char,
-    Bool,
-    Double,
-    DoubleList,
-    Base64,
-    Other
-};
-
-constexpr dwxcore::internal::KeywordPattern kSubTree = MakeKeyword("subtree");
-constexpr dwxcore::internal::KeywordPattern kString = MakeKeyword("string");
-constexpr dwxcore::internal::KeywordPattern kStringList = MakeKeyword("stringlist");
-constexpr dwxcore::internal::KeywordPattern kInteger = MakeKeyword("integer");
-constexpr dwxcore::internal::KeywordPattern kChar = MakeKeyword("char");
-constexpr dwxcore::internal::KeywordPattern kBool = MakeKeyword("bool");
-constexpr dwxcore::internal::KeywordPattern kBase64 = MakeKeyword("base64");
-constexpr dwxcore::internal::KeywordPattern kDouble = MakeKeyword("double");
-constexpr dwxcore::internal::KeywordPattern kDoubleList = MakeKeyword("doublelist");
-constexpr dwxcore::internal::KeywordPattern kTrue = MakeKeyword("true");
-constexpr dwxcore::internal::KeywordPattern kYes = MakeKeyword("yes");
-constexpr dwxcore::internal::KeywordPattern kOne = MakeKeyword("1");
-constexpr dwxcore::internal::KeywordPattern kY = MakeKeyword("y");
-
-// The keyword of `length` bytes, compared ignoring ASCII case; a keyword
-// that begins with "Bool" is a Bool whatever follows.
-Keyword Classify(const char* keyword, size_t length) {
-    switch (keyword[0] | 0x20) {
-        case 's':
-            if (Matches(keyword, length, kSubTree))
-                return Keyword::SubTree;
-            if (Matches(keyword, length, kString))
-                return Keyword::String;
-            if (Matches(keyword, length, kStringList))
-                return Keyword::StringList;
-            break;
-        case 'i':
-            if (Matches(keyword, length, kInteger))
-                return Keyword::Integer;
-            break;
-        case 'c':
-            if (Matches(keyword, length, kChar))
-                return Keyword::Char;
-            break;
-        case 'b':
-            if (BeginsWith(keyword, length, kBool))
-                return Keyword::Bool;
-            if (Matches(keyword, length, kBase64))
-                return Keyword::Base64;
-            break;
-        case 'd':
-            if (Matches(keyword, length, kDouble))
-                return Keyword::Double;
-            if (Matches(keyword, length, kDoubleList))
-                return Keyword::DoubleList;
-            break;
-        default:
-            break;
-    }
-    return Keyword::Other;
-}
-
-bool IsDirective(const char* name, bool& required) {
-    if (name[0] != '@') {
-        return false;
-    }
-    required = _stricmp(name, "@include") == 0;
-    return required || _stricmp(name, "@try_include") == 0;
 }
 
 // The files being read on this thread's current include chain, by canonical
@@ -398,12 +289,12 @@ class TreeReader {
         PTNReadLogWriter::AddWarning(*poLog, code, SourceName(fileName), line, message);
     }
     // The warnings about a leaf line, which the log alone receives.
-    void CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, const char* fileName, int line);
+    void CheckLeaf(PTNKind kind, size_t tokenCount, bool blankName, const char* fileName, int line);
     // Trims the line of `length` bytes at `line`, cuts a glued ')' and splits
     // it in place, from `first`, its first non-white character. Returns the
     // number of tokens; oTokens holds them, null-terminated.
     size_t Split(char* line, size_t length, char* first);
-    DWXParseTreeNode* BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind,
+    DWXParseTreeNode* BuildLeaf(PTNSubTree* parent, const char* name, PTNKind kind,
                                 size_t tokenCount);
     void Include(PTNSubTree* target, const char* directive, const char* file, int line,
                  const PTNSourceFile* source, bool required);
@@ -510,32 +401,32 @@ void TreeReader::ReportCorruptLine(const char* fileName, int line) {
     throw tzn::Exception(-1, 1, message.c_str());
 }
 
-void TreeReader::CheckLeaf(Keyword kind, size_t tokenCount, bool blankName, const char* fileName,
+void TreeReader::CheckLeaf(PTNKind kind, size_t tokenCount, bool blankName, const char* fileName,
                            int line) {
     const char* value = oTokens[2];
     switch (kind) {
-        case Keyword::Other:
+        case PTNKind::kOther:
             if (!blankName) {
                 Warn(PTNReadLog::kUnknownKeyword, fileName, line,
                      MkName(_("Type keyword '%s' builds no node; the line is skipped."),
                             oTokens[1]));
             }
             break;
-        case Keyword::Integer:
+        case PTNKind::kInteger:
             if (!IsIntegerText(value)) {
                 Warn(PTNReadLog::kIntegerText, fileName, line,
                      MkName(_("Integer value '%s' is not a number that fits in int; read as %d."),
                             value, ScanInteger(value)));
             }
             break;
-        case Keyword::Double:
+        case PTNKind::kDouble:
             if (!IsDoubleText(value)) {
                 Warn(PTNReadLog::kDoubleText, fileName, line,
                      MkName(_("Double value '%s' is not a number; read as %s."), value,
                             MkName(ScanDouble(value), -1)));
             }
             break;
-        case Keyword::String:
+        case PTNKind::kString:
             if (tokenCount > 3 && oTokens[3][0] != ')') {
                 Warn(PTNReadLog::kJoinedString, fileName, line,
                      _("String value of several tokens; they are joined without blanks."));
@@ -575,10 +466,10 @@ void TreeReader::ReadNodeLine(PTNSubTree* root, OpenList& open, size_t tokenCoun
                     oTokens[1]));
     }
     bool required = false;
-    Keyword kind = Keyword::Other;
-    if (IsDirective(name, required)) {
+    PTNKind kind = PTNKind::kOther;
+    if (IsIncludeDirective(name, required)) {
         Include(current, name, oTokens[1], line, source, required);
-    } else if ((kind = Classify(oTokens[1], oLengths[1])) == Keyword::SubTree) {
+    } else if ((kind = ClassifyKeyword(oTokens[1], oLengths[1])) == PTNKind::kSubTree) {
         auto subtree = std::make_unique<PTNSubTree>(name);
         PTNSubTree* raw = subtree.get();
         PTNSourceSetter::Set(raw, source, line);
@@ -637,7 +528,7 @@ bool TreeReader::Read(PTNSubTree* root, Lines& lines, const PTNSourceFile* sourc
 }
 
 // The new leaf, appended to `parent`; null for a keyword it builds nothing for.
-DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Keyword kind,
+DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, PTNKind kind,
                                         size_t tokenCount) {
     // The value tokens run from the third token up to the first one that
     // begins with ')'.
@@ -645,70 +536,13 @@ DWXParseTreeNode* TreeReader::BuildLeaf(PTNSubTree* parent, const char* name, Ke
     while (valueEnd < tokenCount && oTokens[valueEnd][0] != ')') {
         ++valueEnd;
     }
-    const char* third = oTokens[2];
-    std::unique_ptr<DWXParseTreeNode> node;
-
-    switch (kind) {
-        case Keyword::String: {
-            const char* token = third;
-            size_t length = oLengths[2];
-            if (valueEnd != 3) {
-                oJoined.clear();
-                for (size_t i = 2; i < valueEnd; ++i) {
-                    oJoined.append(oTokens[i], oLengths[i]);
-                }
-                token = oJoined.c_str();
-                length = oJoined.size();
-            }
-            if (length < PTNStringAdopter::kInline) {
-                node.reset(PTNStringAdopter::MakeShort(name, token));
-            } else {
-                node.reset(PTNStringAdopter::Make(name, UnquoteTokenToHeap(token, length)));
-            }
-            break;
-        }
-        case Keyword::StringList: {
-            auto list = std::make_unique<PTNStringList>(name, nullptr);
-            oTokens[valueEnd] = nullptr;  // the value tokens as a string list
-            list->SetAsStringList(&oTokens[2]);
-            node = std::move(list);
-            break;
-        }
-        case Keyword::Integer:
-            node = std::make_unique<PTNInteger>(name, ScanInteger(third));
-            break;
-        case Keyword::Char:
-            node = std::make_unique<PTNChar>(name, third[0]);
-            break;
-        case Keyword::Bool: {
-            size_t length = oLengths[2];
-            int value = Matches(third, length, kTrue) || Matches(third, length, kYes) ||
-                        Matches(third, length, kOne) || Matches(third, length, kY);
-            node = std::make_unique<PTNBool>(name, value);
-            break;
-        }
-        case Keyword::Double:
-            node = std::make_unique<PTNDouble>(name, ScanDouble(third));
-            break;
-        case Keyword::DoubleList:
-            oDoubles.clear();
-            for (size_t i = 2; i < valueEnd; ++i) {
-                oDoubles.push_back(ScanDouble(oTokens[i]));
-            }
-            // No value tokens give a list without values (and without an array).
-            node = std::make_unique<PTNDoubleList>(name, static_cast<int>(oDoubles.size()),
-                                                   oDoubles.data());
-            break;
-        case Keyword::Base64: {
-            auto data = std::make_unique<PTNBase64>(name, nullptr, 0u);
-            data->SetAsString(third);
-            node = std::move(data);
-            break;
-        }
-        default:
-            return nullptr;  // a keyword the reader builds nothing for
+    const dwxcore::internal::LeafBuilder build =
+        kind != PTNKind::kOther ? KindEntry(kind).build : nullptr;
+    if (build == nullptr) {
+        return nullptr;  // a keyword the reader builds nothing for
     }
-    DWXParseTreeNode* leaf = node.release();
+    LeafTokens line{oTokens.data(), oLengths.data(), valueEnd, oJoined, oDoubles};
+    DWXParseTreeNode* leaf = build(name, line);
     PTNTreeBuilder::Append(parent, leaf);
     return leaf;
 }

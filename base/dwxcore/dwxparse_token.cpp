@@ -80,30 +80,37 @@ void ExpandValue(std::string& value) {
 
 }  // namespace
 
-char* QuoteToken(const char* value) {
-    if (value == nullptr) {
-        return HString("\\q\\q");
-    }
-    std::string token;
-    token.reserve(2 * strlen(value) + 2);
-    token += '"';
+char* PutQuotedToken(char* out, const char* value) {
+    *out++ = '"';
     for (const char* p = value; *p != '\0'; ++p) {
         switch (*p) {
             case '"':
-                token += "\\q";
+                *out++ = '\\';
+                *out++ = 'q';
                 break;
             case '\n':
-                token += "\\n";
+                *out++ = '\\';
+                *out++ = 'n';
                 break;
             case '\\':
-                token += "\\\\";
+                *out++ = '\\';
+                *out++ = '\\';
                 break;
             default:
-                token += *p;
+                *out++ = *p;
         }
     }
-    token += '"';
-    return HString(token.c_str());
+    *out++ = '"';
+    return out;
+}
+
+char* QuoteToken(const char* value) {
+    if (value == nullptr) {
+        return HString(kNullValueToken);
+    }
+    char* token = static_cast<char*>(HMalloc(2 * strlen(value) + 3));
+    *PutQuotedToken(token, value) = '\0';
+    return token;
 }
 
 std::string UnquoteToken(const char* token) {

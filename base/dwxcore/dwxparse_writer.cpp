@@ -10,10 +10,11 @@
 #include <string.h>
 
 #include <string>
-#include <typeinfo>
 #include <vector>
 
+#include "internal/dwxparse_kinds.h"
 #include "internal/dwxparse_numbers.h"
+#include "internal/dwxparse_token.h"
 
 namespace {
 
@@ -21,12 +22,6 @@ using namespace dwxcore::internal;
 
 const char* TextOrEmpty(const char* text) {
     return text != nullptr ? text : "";
-}
-
-// The type keyword of the text format: the class name without "PTN".
-const char* TypeKeyword(const char* className) {
-    const char* name = TextOrEmpty(className);
-    return strlen(name) >= 3 ? name + 3 : name;
 }
 
 char* Put(char* at, const char* text, size_t size) {
@@ -101,53 +96,12 @@ class TextOut {
     size_t nCapacity;
 };
 
-// The library's own node classes. The writer nests plain subtrees and
-// renders the scalar leaves itself; the other leaves, and every other class,
-// a host's subclass included, render through their GetAsString.
-enum class NodeKind {
-    kOther,
-    kSubTree,
-    kOtherLeaf,  // a library leaf without a rendering of the writer's own
-    kBool,
-    kChar,
-    kInteger,
-    kFloat,
-    kDouble,
-    kString
-};
-
-NodeKind KindOf(const DWXParseTreeNode& node) {
-    // Exact classes only. Comparing the type_info addresses first is cheap
-    // and almost always decides; the full comparison is the fallback.
-    static const struct {
-        const std::type_info* type;
-        NodeKind kind;
-    } kKinds[] = {
-        {&typeid(PTNInteger), NodeKind::kInteger},
-        {&typeid(PTNString), NodeKind::kString},
-        {&typeid(PTNSubTree), NodeKind::kSubTree},
-        {&typeid(PTNDouble), NodeKind::kDouble},
-        {&typeid(PTNBool), NodeKind::kBool},
-        {&typeid(PTNChar), NodeKind::kChar},
-        {&typeid(PTNFloat), NodeKind::kFloat},
-        {&typeid(PTNStringList), NodeKind::kOtherLeaf},
-        {&typeid(PTNDoubleList), NodeKind::kOtherLeaf},
-        {&typeid(PTNIntegerList), NodeKind::kOtherLeaf},
-        {&typeid(PTNInteger32List), NodeKind::kOtherLeaf},
-        {&typeid(PTNBase64), NodeKind::kOtherLeaf},
-    };
-    const std::type_info& type = typeid(node);
-    for (const auto& entry : kKinds) {
-        if (&type == entry.type) {
-            return entry.kind;
-        }
-    }
-    for (const auto& entry : kKinds) {
-        if (type == *entry.type) {
-            return entry.kind;
-        }
-    }
-    return NodeKind::kOther;
+// The library's own node classes, by their exact class: the writer nests
+// plain subtrees and renders the leaves in their written form; every other
+// class, a host's subclass included, renders through its GetAsString.
+const NodeKind* KindOf(const DWXParseTreeNode& node) {
+    const PTNKind kind = ExactKindOf(node);
+    return kind != PTNKind::kOther ? &KindEntry(kind) : nullptr;
 }
 
 // A node of another class is nested when its class name is PTNSubTree
@@ -190,12 +144,12 @@ class TreeWriter {
             if (child == nullptr) {
                 continue;
             }
-            const NodeKind kind = KindOf(*child);
+            const NodeKind* kind = KindOf(*child);
             const PTNSubTree* subtree = nullptr;
-            if (kind == NodeKind::kSubTree) {
-                subtree = static_cast<const PTNSubTree*>(child);
-            } else if (kind == NodeKind::kOther) {
+            if (kind == nullptr) {
                 subtree = AsNestedSubTree(*child);
+            } else if (kind->form == WrittenForm::kNested) {
+                subtree = static_cast<const PTNSubTree*>(child);
             }
             if (subtree != nullptr) {
                 OpeningLine(*subtree, depth + 1);
@@ -230,7 +184,7 @@ class TreeWriter {
         const char* blanks = Blanks(indent);
         const char* name = TextOrEmpty(tree.GetName());
         const size_t nameSize = strlen(name);
-        const char* keyword = TypeKeyword(tree.GetClassName());
+        const char* keyword = PTNTypeKeyword(tree.GetClassName());
         const size_t keywordSize = strlen(keyword);
         char* at = oOut.Room(indent + nameSize + keywordSize + 3);
         at = Put(at, blanks, indent);
@@ -275,77 +229,56 @@ class TreeWriter {
         EndLine(at);
     }
 
-    void Leaf(const DWXParseTreeNode& leaf, NodeKind kind, size_t level) {
-        switch (kind) {
-            case NodeKind::kInteger:
-                LeafTail(PutInteger(LeafHead(level, leaf, "Integer", kNumberTextMax),
+    // A leaf of the library's own `kind`, or null for another class.
+    void Leaf(const DWXParseTreeNode& leaf, const NodeKind* kind, size_t level) {
+        const WrittenForm form = kind != nullptr ? kind->form : WrittenForm::kAsString;
+        const char* keyword = kind != nullptr ? kind->keyword : PTNTypeKeyword(leaf.GetClassName());
+        switch (form) {
+            case WrittenForm::kInteger:
+                LeafTail(PutInteger(LeafHead(level, leaf, keyword, kNumberTextMax),
                                     static_cast<const PTNInteger&>(leaf).GetValue()));
                 return;
-            case NodeKind::kBool: {
+            case WrittenForm::kBool: {
                 const char* text = BoolText(static_cast<const PTNBool&>(leaf).GetValue());
                 const size_t size = strlen(text);
-                LeafTail(Put(LeafHead(level, leaf, "Bool", size), text, size));
+                LeafTail(Put(LeafHead(level, leaf, keyword, size), text, size));
                 return;
             }
-            case NodeKind::kChar:
-                LeafTail(PutCharacter(LeafHead(level, leaf, "Char", 1),
+            case WrittenForm::kChar:
+                LeafTail(PutCharacter(LeafHead(level, leaf, keyword, 1),
                                       static_cast<const PTNChar&>(leaf).GetValue()));
                 return;
-            case NodeKind::kFloat:
+            case WrittenForm::kFixed:
                 LeafTail(
-                    PutFixed(LeafHead(level, leaf, "Float", kNumberTextMax),
+                    PutFixed(LeafHead(level, leaf, keyword, kNumberTextMax),
                              static_cast<double>(static_cast<const PTNFloat&>(leaf).GetValue())));
                 return;
-            case NodeKind::kDouble:
-                LeafTail(PutShortest(LeafHead(level, leaf, "Double", kNumberTextMax),
+            case WrittenForm::kShortest:
+                LeafTail(PutShortest(LeafHead(level, leaf, keyword, kNumberTextMax),
                                      static_cast<const PTNDouble&>(leaf).GetValue()));
                 return;
-            case NodeKind::kString:
-                StringLeaf(level, leaf, static_cast<const PTNString&>(leaf).GetValue());
+            case WrittenForm::kQuoted:
+                StringLeaf(level, leaf, keyword, static_cast<const PTNString&>(leaf).GetValue());
                 return;
-            case NodeKind::kSubTree:
-            case NodeKind::kOtherLeaf:
-            case NodeKind::kOther:
+            case WrittenForm::kNested:
+            case WrittenForm::kAsString:
                 break;
         }
-        const char* keyword = TypeKeyword(leaf.GetClassName());
-        char* value = leaf.GetAsString();
-        const char* text = TextOrEmpty(value);
+        HeapText value(leaf.GetAsString());
+        const char* text = TextOrEmpty(value.get());
         const size_t size = strlen(text);
         LeafTail(Put(LeafHead(level, leaf, keyword, size), text, size));
-        free(value);
     }
 
-    // The value as PTNString::GetAsString renders it: a quoted token with
-    // '"', line feed and backslash escaped as \q, \n and \\; \q\q for null.
-    void StringLeaf(size_t level, const DWXParseTreeNode& leaf, const char* value) {
+    // The value as PTNString::GetAsString renders it.
+    void StringLeaf(size_t level, const DWXParseTreeNode& leaf, const char* keyword,
+                    const char* value) {
         if (value == nullptr) {
-            LeafTail(Put(LeafHead(level, leaf, "String", 4), "\\q\\q", 4));
+            const size_t size = sizeof kNullValueToken - 1;
+            LeafTail(Put(LeafHead(level, leaf, keyword, size), kNullValueToken, size));
             return;
         }
-        const size_t size = strlen(value);
-        char* at = LeafHead(level, leaf, "String", 2 * size + 2);
-        *at++ = '"';
-        for (const char* p = value; *p != '\0'; ++p) {
-            switch (*p) {
-                case '"':
-                    *at++ = '\\';
-                    *at++ = 'q';
-                    break;
-                case '\n':
-                    *at++ = '\\';
-                    *at++ = 'n';
-                    break;
-                case '\\':
-                    *at++ = '\\';
-                    *at++ = '\\';
-                    break;
-                default:
-                    *at++ = *p;
-            }
-        }
-        *at++ = '"';
-        LeafTail(at);
+        LeafTail(PutQuotedToken(LeafHead(level, leaf, keyword, 2 * strlen(value) + 2), value));
     }
 
     TextOut& oOut;

@@ -1,6 +1,9 @@
 #include <dwxcore/dwxprefmodel.h>
 
 #include <services/portability.h>
+#include <services/rtprim.h>
+
+#include "internal/dwxparse_kinds.h"
 
 #include <stdlib.h>
 #include <string.h>
@@ -21,7 +24,8 @@ bool IsStorableKey(const char* key) {
             return false;
         }
     }
-    return _stricmp(key, "@include") != 0 && _stricmp(key, "@try_include") != 0;
+    bool required = false;
+    return !dwxcore::internal::IsIncludeDirective(key, required);
 }
 
 // Reading a String value expands translation and list forms; a text that
@@ -29,7 +33,7 @@ bool IsStorableKey(const char* key) {
 // the text through the same quoting and unquoting the writer and reader use.
 bool ReadsBackUnchanged(const char* text) {
     PTNString written("value", text);
-    std::unique_ptr<char, decltype(&free)> token(written.GetAsString(), &free);
+    HeapText token(written.GetAsString());
     PTNString read("value", nullptr);
     read.SetAsString(token.get());
     return read.GetValue() != nullptr && strcmp(read.GetValue(), text) == 0;

@@ -1,5 +1,7 @@
 #include <dwxcore/dwxtranslate.h>
 
+#include <tuple>
+
 namespace {
 
 void Put(double* target, double value) {
@@ -25,18 +27,12 @@ DWXTranslate::DWXTranslate()
       dDestY2(0.0) {}
 
 void DWXTranslate::SetSrcRect(double x1, double y1, double x2, double y2) {
-    dSrcX1 = x1;
-    dSrcY1 = y1;
-    dSrcX2 = x2;
-    dSrcY2 = y2;
+    std::tie(dSrcX1, dSrcY1, dSrcX2, dSrcY2) = std::tie(x1, y1, x2, y2);
     CalculateTransform();
 }
 
 void DWXTranslate::SetDestRect(double x1, double y1, double x2, double y2) {
-    dDestX1 = x1;
-    dDestY1 = y1;
-    dDestX2 = x2;
-    dDestY2 = y2;
+    std::tie(dDestX1, dDestY1, dDestX2, dDestY2) = std::tie(x1, y1, x2, y2);
     CalculateTransform();
 }
 

@@ -10,6 +10,18 @@
 #include <services/services_export.h>
 
 #include <stddef.h>
+#include <stdlib.h>
+
+#include <memory>
+
+// Releases with free() a block handed out here (or by any malloc).
+struct FreeDeleter {
+    void operator()(void* block) const { free(block); }
+};
+// A heap block its holder releases with free(): HeapPtr<char> holds a text.
+template <typename T>
+using HeapPtr = std::unique_ptr<T, FreeDeleter>;
+using HeapText = HeapPtr<char>;
 
 // A block of at least `size` bytes; size 0 gives a valid block. Caller frees with free().
 DWXSERVICES_API void* HMalloc(size_t size);

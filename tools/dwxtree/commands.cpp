@@ -7,6 +7,7 @@
 
 #include <dwxcore/dwxobject.h>
 #include <dwxcore/dwxparse.h>
+#include <services/rtprim.h>
 #include <services/utilhub.h>
 
 #include <errno.h>
@@ -113,28 +114,34 @@ bool SplitPath(const std::string& path, std::vector<std::string>& names) {
 }
 
 void PrintValue(FILE* stream, DWXParseTreeNode* node) {
-    if (auto* subtree = dynamic_cast<PTNSubTree*>(node)) {
-        subtree->WriteToFile(stream);
-    } else if (auto* string = dynamic_cast<PTNString*>(node)) {
-        fprintf(stream, "%s\n", string->GetValue() ? string->GetValue() : "");
-    } else if (auto* strings = dynamic_cast<PTNStringList*>(node)) {
-        for (char** entry = strings->GetValue(); entry && *entry; ++entry) {
+    const PTNKind kind = PTNKindOf(node);
+    if (kind == PTNKind::kSubTree) {
+        static_cast<PTNSubTree*>(node)->WriteToFile(stream);
+        return;
+    }
+    if (kind == PTNKind::kString) {
+        const char* value = static_cast<PTNString*>(node)->GetValue();
+        fprintf(stream, "%s\n", value ? value : "");
+        return;
+    }
+    if (kind == PTNKind::kStringList) {
+        for (char** entry = static_cast<PTNStringList*>(node)->GetValue(); entry && *entry;
+             ++entry) {
             fprintf(stream, "%s\n", *entry);
         }
-    } else {
-        // Numbers, Bool, Char, Base64 and the numeric lists: the text the
-        // leaf renders, a list with one element per line.
-        char* text = node->GetAsString();
-        std::string value = text ? text : "";
-        free(text);
-        bool list = dynamic_cast<PTNDoubleList*>(node) || dynamic_cast<PTNIntegerList*>(node) ||
-                    dynamic_cast<PTNInteger32List*>(node);
-        if (list) {
-            std::replace(value.begin(), value.end(), ' ', '\n');
-        }
-        if (!list || !value.empty()) {
-            fprintf(stream, "%s\n", value.c_str());
-        }
+        return;
+    }
+    // Numbers, Bool, Char, Base64 and the numeric lists: the text the leaf
+    // renders, a list with one element per line.
+    HeapText text(node->GetAsString());
+    std::string value = text ? text.get() : "";
+    const bool list = kind == PTNKind::kDoubleList || kind == PTNKind::kIntegerList ||
+                      kind == PTNKind::kInteger32List;
+    if (list) {
+        std::replace(value.begin(), value.end(), ' ', '\n');
+    }
+    if (!list || !value.empty()) {
+        fprintf(stream, "%s\n", value.c_str());
     }
 }
 
@@ -250,8 +257,8 @@ int RunGet(const Arguments& args) {
         auto* subtree = dynamic_cast<PTNSubTree*>(node);
         if (!subtree) {
             Report(file.name, 0, Severity::kError,
-                   Quote(path) + " not found: " + Quote(walked) + " is a " + TypeKeyword(*node) +
-                       ", not a SubTree");
+                   Quote(path) + " not found: " + Quote(walked) + " is a " +
+                       PTNTypeKeyword(node->GetClassName()) + ", not a SubTree");
             return kExitData;
         }
         // "name[N]" is the N-th child of that name; a name that holds

@@ -3,6 +3,7 @@
 #include "treefile.h"
 
 #include <dwxcore/dwxobject.h>
+#include <services/rtprim.h>
 #include <services/utilhub.h>
 
 #include <math.h>
@@ -81,37 +82,55 @@ std::string IntText(int value) {
 // A leaf's value; subtrees are written by WriteJson's walk.
 void WriteLeaf(FILE* stream, DWXParseTreeNode* node) {
     int count = 0;
-    if (auto* flag = dynamic_cast<PTNBool*>(node)) {
-        fputs(flag->GetValue() ? "true" : "false", stream);
-    } else if (auto* integer = dynamic_cast<PTNInteger*>(node)) {
-        fputs(IntText(integer->GetValue()).c_str(), stream);
-    } else if (auto* single = dynamic_cast<PTNFloat*>(node)) {
-        fputs(JsonNumber(single->GetValue()).c_str(), stream);
-    } else if (auto* number = dynamic_cast<PTNDouble*>(node)) {
-        fputs(JsonNumber(number->GetValue()).c_str(), stream);
-    } else if (auto* character = dynamic_cast<PTNChar*>(node)) {
-        char text[2] = {character->GetValue(), '\0'};
-        fputs(Quoted(text).c_str(), stream);
-    } else if (auto* string = dynamic_cast<PTNString*>(node)) {
-        fputs(Quoted(string->GetValue()).c_str(), stream);
-    } else if (auto* strings = dynamic_cast<PTNStringList*>(node)) {
-        char** list = strings->GetValue();
-        WriteArray(stream, list, CountStringList(list), Quoted);
-    } else if (auto* integers = dynamic_cast<PTNIntegerList*>(node)) {
-        int* values = integers->GetValue(&count);
-        WriteArray(stream, values, count, IntText);
-    } else if (auto* integers32 = dynamic_cast<PTNInteger32List*>(node)) {
-        int* values = integers32->GetValue(&count);
-        WriteArray(stream, values, count, IntText);
-    } else if (auto* doubles = dynamic_cast<PTNDoubleList*>(node)) {
-        double* values = doubles->GetValue(&count);
-        WriteArray(stream, values, count, JsonNumber);
-    } else {
-        // Base64 and any other leaf: the text the leaf renders.
-        char* text = node->GetAsString();
-        fputs(Quoted(text ? text : "").c_str(), stream);
-        free(text);
+    switch (PTNKindOf(node)) {
+        case PTNKind::kBool:
+            fputs(static_cast<PTNBool*>(node)->GetValue() ? "true" : "false", stream);
+            return;
+        case PTNKind::kInteger:
+            fputs(IntText(static_cast<PTNInteger*>(node)->GetValue()).c_str(), stream);
+            return;
+        case PTNKind::kFloat:
+            fputs(JsonNumber(static_cast<PTNFloat*>(node)->GetValue()).c_str(), stream);
+            return;
+        case PTNKind::kDouble:
+            fputs(JsonNumber(static_cast<PTNDouble*>(node)->GetValue()).c_str(), stream);
+            return;
+        case PTNKind::kChar: {
+            char text[2] = {static_cast<PTNChar*>(node)->GetValue(), '\0'};
+            fputs(Quoted(text).c_str(), stream);
+            return;
+        }
+        case PTNKind::kString:
+            fputs(Quoted(static_cast<PTNString*>(node)->GetValue()).c_str(), stream);
+            return;
+        case PTNKind::kStringList: {
+            char** list = static_cast<PTNStringList*>(node)->GetValue();
+            WriteArray(stream, list, CountStringList(list), Quoted);
+            return;
+        }
+        case PTNKind::kIntegerList: {
+            int* values = static_cast<PTNIntegerList*>(node)->GetValue(&count);
+            WriteArray(stream, values, count, IntText);
+            return;
+        }
+        case PTNKind::kInteger32List: {
+            int* values = static_cast<PTNInteger32List*>(node)->GetValue(&count);
+            WriteArray(stream, values, count, IntText);
+            return;
+        }
+        case PTNKind::kDoubleList: {
+            double* values = static_cast<PTNDoubleList*>(node)->GetValue(&count);
+            WriteArray(stream, values, count, JsonNumber);
+            return;
+        }
+        case PTNKind::kSubTree:
+        case PTNKind::kBase64:
+        case PTNKind::kOther:
+            break;
     }
+    // Base64 and any other leaf: the text the leaf renders.
+    HeapText text(node->GetAsString());
+    fputs(Quoted(text ? text.get() : "").c_str(), stream);
 }
 
 }  // namespace

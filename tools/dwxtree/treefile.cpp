@@ -3,6 +3,7 @@
 #include "iofiles.h"
 
 #include <dwxcore/dwxobject.h>
+#include <services/rtprim.h>
 #include <services/utilhub.h>
 
 #include <ctype.h>
@@ -180,11 +181,6 @@ std::string Wording(const PTNReadReport& report) {
     return line;
 }
 
-struct FreeText {
-    void operator()(char* text) const { free(text); }
-};
-using HeapText = std::unique_ptr<char, FreeText>;
-
 void OnReport(int /*code*/, int severity, const char* message) {
     Report(std::string(), 0, severity <= 1 ? Severity::kError : Severity::kWarning,
            OneLine(message));
@@ -295,11 +291,6 @@ std::string SourceName(const TreeFile& file, const PTNSourceFile& source) {
     return source.includedBy ? source.name : file.name;
 }
 
-const char* TypeKeyword(const DWXParseTreeNode& node) {
-    const char* name = node.GetClassName();
-    return strncmp(name, "PTN", 3) == 0 ? name + 3 : name;
-}
-
 void WriteTopLevel(FILE* stream, const PTNSubTree& root) {
     DWXIter iter(root.GetChildren());
     for (DWXObject* object = iter.Start(); object; object = iter.Next()) {
@@ -309,7 +300,7 @@ void WriteTopLevel(FILE* stream, const PTNSubTree& root) {
             continue;
         }
         HeapText value(node->GetAsString());
-        fprintf(stream, "(%s %s %s)\n", node->GetName(), TypeKeyword(*node),
+        fprintf(stream, "(%s %s %s)\n", node->GetName(), PTNTypeKeyword(node->GetClassName()),
                 value ? value.get() : "");
     }
 }

@@ -67,7 +67,4 @@ std::string SourceName(const TreeFile& file, const PTNSourceFile& source);
 // Read back, the text gives the same top-level nodes.
 void WriteTopLevel(FILE* stream, const PTNSubTree& root);
 
-// The type keyword of a node, its class name without "PTN".
-const char* TypeKeyword(const DWXParseTreeNode& node);
-
 }  // namespace dwxtree

@@ -13,6 +13,13 @@ namespace dwxcore::internal {
 // Caller frees with free().
 char* QuoteToken(const char* value);
 
+// The token of a null value.
+constexpr char kNullValueToken[] = "\\q\\q";
+
+// The token of `value`, which is not null, written at `out` with room for
+// 2 * strlen(value) + 2 bytes; returns the end of what it wrote. O(length).
+char* PutQuotedToken(char* out, const char* value);
+
 // The value of `token`: unquoted quote marks dropped, escapes undone, then the
 // '@' translation forms and ExpandMkTokenString applied. Null gives "".
 std::string UnquoteToken(const char* token);
