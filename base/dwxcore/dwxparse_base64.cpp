@@ -162,6 +162,24 @@ __attribute__((target("ssse3"))) inline bool DecodeBlockSsse3(const unsigned cha
     return true;
 }
 
+// The loops stand in functions compiled for SSSE3 themselves, so that the
+// block steps inline into them instead of being called once per block.
+__attribute__((target("ssse3"))) void EncodeRunSsse3(const unsigned char*& in,
+                                                     const unsigned char* end, char*& out) {
+    for (; end - in >= 16; in += 12, out += 16) {
+        EncodeBlockSsse3(in, out);
+    }
+}
+
+// Returns the characters decoded; stops before a block with a byte outside
+// the alphabet.
+__attribute__((target("ssse3"))) size_t DecodeRunSsse3(const unsigned char* in, size_t size,
+                                                       unsigned char*& out) {
+    size_t pos = 0;
+    for (; pos + 16 <= size && DecodeBlockSsse3(in + pos, out); pos += 16, out += 12) {
+    }
+    return pos;
+}
 #endif
 
 // Encodes `count` bytes, a multiple of 3, into 4 * count / 3 characters.
@@ -169,9 +187,7 @@ char* EncodeWhole(const unsigned char* in, size_t count, char* out) {
     const unsigned char* const end = in + count;
 #if DWX_BASE64_SSSE3
     if (HaveSsse3()) {
-        for (; end - in >= 16; in += 12, out += 16) {
-            EncodeBlockSsse3(in, out);
-        }
+        EncodeRunSsse3(in, end, out);
     }
 #endif
     for (; end - in >= 12; in += 12) {
@@ -249,8 +265,7 @@ size_t DecodeWhole(const unsigned char* in, size_t size, unsigned char* out, uns
     size_t pos = 0;
 #if DWX_BASE64_SSSE3
     if (HaveSsse3()) {
-        for (; pos + 16 <= size && DecodeBlockSsse3(in + pos, out); pos += 16, out += 12) {
-        }
+        pos = DecodeRunSsse3(in, size, out);
     }
 #endif
     for (; pos + 16 <= size; pos += 16, out += 12) {
