@@ -6,6 +6,9 @@
 // getters lend the node's own storage; texts and nodes handed out as new are
 // the caller's (texts are released with free(), nodes with delete). A subtree
 // owns its children and deletes them with itself.
+//
+// Numbers: "atoi"/"atof" below mean their rules as the "C" locale applies them,
+// whatever locale the host has set; numbers are written with a point always.
 #pragma once
 
 #include <dwxcore/dwxcore_export.h>

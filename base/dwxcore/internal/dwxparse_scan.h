@@ -99,9 +99,9 @@ inline bool BeginsWith(const char* text, size_t length, const KeywordPattern& ke
     return length >= keyword.length && MatchesAt(text, keyword);
 }
 
-// atoi (text). A sign and up to nine digits that end the token are read
-// here; anything else (long numbers with their overflow, leading white space
-// of the locale, trailing text) goes to atoi itself, so results are the same.
+// atoi (text) in the "C" locale. A sign and up to nine digits that end the
+// token are read here; anything else (long numbers with their overflow,
+// leading white space, trailing text) goes to TZN_atoi, so results are the same.
 inline int ScanInteger(const char* text) {
     const char* p = text;
     bool negative = *p == '-';
@@ -125,7 +125,7 @@ inline int ScanInteger(const char* text) {
 // atof (text). A token that is a plain decimal, a sign, up to fifteen digits
 // and a point, is read here: the digits as an exact integer divided by an
 // exact power of ten is one correctly rounded operation, as strtod's result
-// is, in every rounding mode. Anything else goes to atof itself.
+// is, in every rounding mode. Anything else goes to TZN_atof.
 inline double ScanDouble(const char* text) {
     static const double kPowersOfTen[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
                                           1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
