@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <stdlib.h>
+#include <algorithm>
 #include <memory>
 #include <random>
 #include <vector>
@@ -257,6 +258,53 @@ TEST_F(ArrayTest, PackedRemoveMovesTheLastMember) {
     EXPECT_EQ(packed.Remove(&d), 1);
     EXPECT_FALSE(packed.HasBuffer());
     EXPECT_EQ(packed.Capacity(), 0);
+}
+
+}  // namespace
+
+namespace {
+
+// Random adds, removals, stores and inserts against a plain list of slots: the
+// members, their slots and the walk must agree after every step, so an Add
+// that skipped the reuse of trailing empty slots would show.
+TEST_F(ArrayTest, AddsAgreeWithASlotModel) {
+    std::vector<CountingObject> items(24);
+    std::mt19937 random(917);
+    SlotView<DWXArray> array;
+    std::vector<DWXObject*> slots;
+    for (int step = 0; step < 2000; ++step) {
+        DWXObject* item = random() % 5 ? &items[random() % items.size()] : nullptr;
+        size_t index = random() % (slots.size() + 4);  // mostly near the top
+        unsigned operation = random() % 6;
+        if (operation < 3) {
+            array.Add(item);
+            while (item && !slots.empty() && !slots.back())
+                slots.pop_back();  // Add reuses trailing empty slots
+            if (item)
+                slots.push_back(item);
+        } else if (operation == 3) {
+            if (array.Remove(item)) {
+                *std::find(slots.begin(), slots.end(), item) = nullptr;
+            }
+        } else if (operation == 4) {
+            array.SetAt(static_cast<int>(index), item);
+            slots.resize(std::max(slots.size(), index + 1));
+            slots[index] = item;
+        } else {
+            array.InsertAt(static_cast<int>(index), item);
+            slots.resize(std::max(slots.size(), index));
+            slots.insert(slots.begin() + static_cast<long>(index), item);
+        }
+        std::vector<DWXObject*> members;
+        for (size_t i = 0; i < slots.size() + 2; ++i) {
+            DWXObject* slot = i < slots.size() ? slots[i] : nullptr;
+            ASSERT_EQ(array[static_cast<int>(i)], slot) << "slot " << i << " at step " << step;
+            if (slot)
+                members.push_back(slot);
+        }
+        ASSERT_EQ(Walk(array), members) << "step " << step;
+        ASSERT_EQ(array.GetCount(), static_cast<int>(members.size()));
+    }
 }
 
 }  // namespace

@@ -278,3 +278,24 @@ TEST(Date, SetTodayReadsDayMonthYear) {
     EXPECT_TRUE(reports.Take().empty());
 }
 #endif
+
+namespace {
+
+// The day count divides years by 4, 100 and 400, rounding down also below
+// year 1: every 400 years hold 146097 days, wherever they start.
+TEST(Date, DifferencesRepeatEvery400YearsAcrossTheIntRange) {
+    ReportCapture quiet;  // years below 1
+    for (int year : {INT_MIN, -1000001, -801, -400, -399, -1, 0, 1, 2, 100, 1600, 1700, 2000, 2001,
+                     2100, 1000000, INT_MAX - 400}) {
+        for (int month : {1, 2, 3, 12}) {
+            for (int day : {-40, 0, 1, 28, 29, 31, 40}) {
+                DWXDate early(month, day, year), late(month, day, year + 400);
+                ASSERT_EQ(late.GetDifference(early), 146097) << month << "/" << day << "/" << year;
+            }
+        }
+        DWXDate march(3, 1, year), february(2, 28, year);
+        EXPECT_EQ(march.GetDifference(february), 1 + DWXDate::LeapYear(year)) << year;
+    }
+}
+
+}  // namespace

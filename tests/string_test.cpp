@@ -208,3 +208,31 @@ TEST(DWXString, FormattedTextEndsAtANulAndAnEmptyTerminatorIsWritable) {
 }
 
 }  // namespace
+
+namespace {
+
+TEST(DWXString, CharAppendsFromEveryKindOfString) {
+    DWXString nil, exact("xy"), truncated("abcdef"), formatted = DWXFormat("%d", 42);
+    DWXString nuls("a\0b", 3);
+    truncated.SetLength(2);  // a block with room to spare
+    struct {
+        DWXString* s;
+        std::string text;
+    } cases[] = {{&nil, ""},
+                 {&exact, "xy"},
+                 {&truncated, "ab"},
+                 {&formatted, "42"},
+                 {&nuls, std::string("a\0b", 3)}};
+    for (auto& c : cases) {
+        for (int i = 0; i < 300; ++i) {
+            char ch = i % 7 == 0 ? '\0' : static_cast<char>('a' + i % 26);
+            *c.s += ch;
+            c.text += ch;
+            const char* data = *c.s;
+            ASSERT_EQ(std::string(data, static_cast<size_t>(c.s->GetLength())), c.text);
+            ASSERT_EQ(data[c.s->GetLength()], '\0') << "after " << i + 1 << " appends";
+        }
+    }
+}
+
+}  // namespace
