@@ -309,6 +309,13 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
     tree.BuildFromFile(nullptr);  // ignored
 }
 
+PTNReadLog ReadLogged(PTNSubTree& tree, const std::string& path) {
+    PTNReadLog log;
+    std::unique_ptr<FILE, int (*)(FILE*)> stream(DKOpen(path.c_str(), 4, "r"), DKClose);
+    EXPECT_NO_THROW(tree.BuildFromFile(stream.get(), &log));
+    return log;
+}
+
 std::string Missing(const std::string& file, const char* directive, int line,
                     const std::string& in) {
     return "3/2 Unable to locate file '" + file + "'\nrequested in " + directive +
@@ -321,6 +328,7 @@ TEST_F(ReaderTest, Includes) {
     struct Case {
         std::vector<std::pair<std::string, std::string>> files;
         std::string outcome;
+        bool nextToIncluder = false;  // relative names searched next to the including file first
     };
     std::vector<Case> cases = {
         // Included nodes sit in place; an included file counts its own lines,
@@ -363,6 +371,13 @@ TEST_F(ReaderTest, Includes) {
           {"c", "(c Integer 1)\n(@include @d)\n"},
           {"d", "(d Integer 1)\n"}},
          "b d c d"},
+        {{{"conf/main", "(@include part.cfg)\n(m Integer 1)\n"},
+          {"conf/part", "(near Integer 1)\n(@include sub/deep.cfg)\n"},
+          {"conf/sub/deep", "(deep Integer 1)\n(@include both.cfg)\n"}},
+         "near deep fromEtc m",
+         true},
+        {{{"conf/main", "(@include part.cfg)\n(m Integer 1)\n"}},
+         Missing("part.cfg", "@include", 1, "@conf/main") + "m"},
         // The null device, under any name, and an empty file are empty
         // includes; other files that are not regular ones are missing, and a
         // FIFO without a writer is refused rather than waited on.
@@ -413,9 +428,24 @@ TEST_F(ReaderTest, Includes) {
         for (const auto& file : c.files) {
             oDir.Write(file.first + ".cfg", resolve(file.second));
         }
-        PTNSubTree tree("root");
-        EXPECT_EQ(Outcome(tree, [&] { ReadFile(tree, oDir.Path(c.files[0].first + ".cfg")); }),
-                  resolve(c.outcome));
+        PTNSubTree::SetIncludeSearchNextToIncluder(c.nextToIncluder);
+        std::string path = oDir.Path(c.files[0].first + ".cfg");
+        PTNSubTree tree("root"), logged("root");
+        EXPECT_EQ(Outcome(tree, [&] { ReadFile(tree, path); }), resolve(c.outcome));
+        // With a log: the same tree, and each report there, naming its file and line.
+        Texts host = oCapture.Texts();
+        oCapture.Clear();
+        PTNReadLog log = ReadLogged(logged, path);
+        EXPECT_TRUE(oCapture.Texts().empty());
+        EXPECT_EQ(Shape(&logged), Shape(&tree));
+        ASSERT_EQ(log.Reports().size(), host.size());
+        for (size_t i = 0; i < host.size(); ++i) {
+            const PTNReadReport& r = log.Reports()[i];
+            EXPECT_EQ(std::to_string(r.code) + "/" + std::to_string(r.severity),
+                      host[i].substr(0, host[i].find(' ')));
+            EXPECT_NE(host[i].find(r.file), std::string::npos) << host[i];
+            EXPECT_NE(host[i].find("line " + std::to_string(r.line)), std::string::npos) << host[i];
+        }
     }
 }
 
@@ -484,34 +514,6 @@ TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
               report("/proc/self/mem", 0));
 }
 
-PTNReadLog ReadLogged(PTNSubTree& tree, const std::string& path) {
-    PTNReadLog log;
-    std::unique_ptr<FILE, int (*)(FILE*)> stream(DKOpen(path.c_str(), 4, "r"), DKClose);
-    EXPECT_NO_THROW(tree.BuildFromFile(stream.get(), &log));
-    return log;
-}
-
-TEST_F(ReaderTest, LogNamesIncludedFilesAndTheirOwnLines) {
-    std::string inc =
-        oDir.Write("inc.cfg", "! 1\n(x Integr 5)\n(s SubTree\n(bad)\n)\n(lost Integer 1)\n");
-    std::string main = oDir.Write("main.cfg", "(a Integer 1)\n(@include " + inc + ")\n(@include " +
-                                                  oDir.Path("none.cfg") + ")\n(@include " + inc +
-                                                  ")\n(b Integer 2)\n");
-    PTNSubTree tree("root");
-    PTNReadLog log = ReadLogged(tree, main);
-    EXPECT_EQ(Shape(&tree), "a s{} s{} b");
-    Texts entries;
-    for (const auto* list : {&log.Reports(), &log.Warnings()}) {
-        for (const PTNReadReport& r : *list) {
-            entries.push_back(std::to_string(r.code) + " " + r.file + ":" + std::to_string(r.line));
-        }
-    }
-    EXPECT_EQ(entries, (Texts{"-1 " + inc + ":4", "3 " + main + ":3", "-1 " + inc + ":4",
-                              "101 " + inc + ":2", "101 " + inc + ":2"}));
-    EXPECT_EQ(log.Files(), (Texts{main, inc}));  // once each, the starting file first
-    EXPECT_TRUE(oCapture.Texts().empty());
-}
-
 // A node's line and the chain of files that reached it, "line file@includedAtLine ...".
 std::string Where(const DWXParseTreeNode* node) {
     std::string text = std::to_string(node->GetSourceLine());
@@ -551,22 +553,6 @@ TEST_F(ReaderTest, SourcesThroughIncludesCopiesMergesAndRereads) {
     EXPECT_EQ(Where(other->Find("s/deep")), "4 Memory@0");
     PTNInteger made("made", 1);
     EXPECT_EQ(Where(&made), "0");  // not built by the reader
-}
-
-TEST_F(ReaderTest, IncludesNextToTheIncluder) {
-    std::string main = oDir.Write("conf/main.cfg", "(@include part.cfg)\n(m Integer 1)\n");
-    std::string part = oDir.Write("conf/part.cfg", "(near Integer 1)\n(@include sub/deep.cfg)\n");
-    std::string deep = oDir.Write("conf/sub/deep.cfg", "(deep Integer 1)\n(@include etc.cfg)\n");
-    std::string etc = oDir.Write("etc/etc.cfg", "(viaEtc Integer 1)\n");
-    setenv(DWX_ETC_PATH_VARIABLE, oDir.Path("etc").c_str(), 1);
-    for (bool on : {false, true, false}) {
-        PTNSubTree::SetIncludeSearchNextToIncluder(on);
-        PTNSubTree tree("root");
-        PTNReadLog log = ReadLogged(tree, main);
-        EXPECT_EQ(Shape(&tree), on ? "near deep viaEtc m" : "m");
-        EXPECT_EQ(log.Reports().size(), on ? 0u : 1u);
-        EXPECT_EQ(log.Files(), on ? (Texts{main, part, deep, etc}) : Texts{main});
-    }
 }
 
 }  // namespace
