@@ -39,7 +39,7 @@ class ReaderTest : public ::testing::Test {
     }
     // Everything a read leaves: each report, "thrown" if it threw (with the
     // last report's message), and the tree.
-    std::string Outcome(PTNSubTree& tree, const std::function<void()>& read, bool values = false) {
+    std::string Outcome(PTNSubTree& tree, bool values, const std::function<void()>& read) {
         oCapture.Clear();
         std::string thrown, outcome;
         try {
@@ -147,14 +147,13 @@ TEST_F(ReaderTest, ErrorsAndWarningsWithAndWithoutALog) {
         {"(t SubTree\n(w Integer -2147483648)\n(b Bool yes)\n(s String \"x y\" )\n"
          "(d Double -2.5e3)\n(e Double .5)\n(k Integer +7)\n)\n",
          "t{w b s d e k}", ""},
-        {"! c\n(port Integr 8080)\n(f Float 1.5)\n", "", "101/3:2 101/3:3"},
-        {"(a Integer 1)\n)\n(b Integer 2)\n", "a", "102/3:2"},
+        {"! c\n(port Integr 8080)\n(f Float 1.5)\n(i Integer 12abc)\n(j Integer 2147483648)\n"
+         "(m Integer -)\n(n Integer -2147483649)\n(d Double 1.5x)\n(e Double abc)\n#\n\n"
+         "(s String \"a\" \"b\")\n(a Integer 1)\n)\n(b Integer 2)\n",
+         "i j m n d e s a",
+         "101/3:2 101/3:3 104/3:4 104/3:5 104/3:6 104/3:7 105/3:8 105/3:9 106/3:12 102/3:14"},
         // The blank makes config the keyword; the closing line then ends the read.
         {"( config SubTree\n(x Integer 1)\n)\n(y Integer 2)\n", "x", "103/3:1 102/3:3"},
-        {"(i Integer 12abc)\n(j Integer 2147483648)\n(m Integer -)\n(n Integer -2147483649)\n",
-         "i j m n", "104/3:1 104/3:2 104/3:3 104/3:4"},
-        {"(d Double 1.5x)\n(f Double abc)\n", "d f", "105/3:1 105/3:2"},
-        {"#\n\n(s String \"a\" \"b\")\n", "s", "106/3:3"},
         // A glued ')' is cut, so "(t SubTree)" opens a subtree and "  )" closes it.
         {"(t SubTree)\n  (a Integer 1)\n  )\n(b Integer 2)\n", "t{a} b", ""},
         {"", "", ""},
@@ -181,7 +180,8 @@ TEST_F(ReaderTest, ErrorsAndWarningsWithAndWithoutALog) {
         }
         EXPECT_EQ(entries, row.log);
         EXPECT_EQ(log.Ok(), log.Reports().empty());
-        EXPECT_EQ(Outcome(plain, [&] { plain.BuildFromString(row.text.c_str()); }), row.outcome);
+        EXPECT_EQ(Outcome(plain, false, [&] { plain.BuildFromString(row.text.c_str()); }),
+                  row.outcome);
         EXPECT_EQ(Shape(&logged, true), Shape(&plain, true));
     }
 }
@@ -248,25 +248,19 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
     for (const std::string& text : texts) {
         std::string path = oDir.Write("case.cfg", text);
         PTNSubTree inPlace("root"), fromList("root"), fromBuffer("root");
-        std::string expected = Outcome(
-            fromList,
-            [&] {
-                std::unique_ptr<char*, void (*)(char**)> lines(TextFileToStringList(path.c_str()),
-                                                               DestroyStringList);
-                int counter = 0;
-                fromList.AddChildrenFromStringList(lines.get(), path.c_str(), &counter);
-            },
-            true);
-        EXPECT_EQ(Outcome(
-                      inPlace, [&] { ReadFile(inPlace, path); }, true),
-                  expected)
+        std::string expected = Outcome(fromList, true, [&] {
+            std::unique_ptr<char*, void (*)(char**)> lines(TextFileToStringList(path.c_str()),
+                                                           DestroyStringList);
+            int counter = 0;
+            fromList.AddChildrenFromStringList(lines.get(), path.c_str(), &counter);
+        });
+        EXPECT_EQ(Outcome(inPlace, true, [&] { ReadFile(inPlace, path); }), expected)
             << text.size();
         if (text.find('\0') == std::string::npos) {
             for (size_t at; (at = expected.find(path)) != std::string::npos;) {
                 expected.replace(at, path.size(), "Memory");
             }
-            EXPECT_EQ(Outcome(
-                          fromBuffer, [&] { fromBuffer.BuildFromString(text.c_str()); }, true),
+            EXPECT_EQ(Outcome(fromBuffer, true, [&] { fromBuffer.BuildFromString(text.c_str()); }),
                       expected);
         }
     }
@@ -277,7 +271,7 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
     ASSERT_NE(foreign, nullptr);
     fgetc(foreign);
     PTNSubTree tree("root");
-    EXPECT_EQ(Outcome(tree, [&] { tree.BuildFromFile(foreign); }),
+    EXPECT_EQ(Outcome(tree, false, [&] { tree.BuildFromFile(foreign); }),
               Corrupt("Memory", 3) + "thrown\na");
     EXPECT_EQ(ftell(foreign), 0);
     fclose(foreign);
@@ -404,11 +398,11 @@ TEST_F(ReaderTest, Includes) {
         PTNSubTree::SetIncludeSearchNextToIncluder(c.nextToIncluder);
         std::string path = oDir.Path(c.files[0].first + ".cfg");
         PTNSubTree tree("root"), logged("root");
-        EXPECT_EQ(Outcome(tree, [&] { ReadFile(tree, path); }), resolve(c.outcome));
+        EXPECT_EQ(Outcome(tree, false, [&] { ReadFile(tree, path); }), resolve(c.outcome));
         // With a log: the same tree, and each report there, naming its file and line.
         Texts host = oCapture.Texts();
         PTNReadLog log;
-        EXPECT_EQ(Outcome(logged,
+        EXPECT_EQ(Outcome(logged, false,
                           [&] {
                               std::unique_ptr<FILE, int (*)(FILE*)> stream(
                                   DKOpen(path.c_str(), 4, "r"), DKClose);
@@ -459,12 +453,12 @@ TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
     ASSERT_NE(stream, nullptr);
     PTNSubTree tree("root"), whole("root");
     EXPECT_EQ(Outcome(
-                  tree, [&] { tree.BuildFromFile(stream); }, true),
+                  tree, false, [&] { tree.BuildFromFile(stream); }, true),
               ReadError("Memory", 3) + "a:PTNInteger=1 s{b:PTNInteger=2}");
     fclose(stream);
     // The kernel refuses to read the first page of a process's memory: a
     // real error on a file that passes every check (see also the includes).
-    EXPECT_EQ(Outcome(whole, [&] { ReadFile(whole, "/proc/self/mem"); }),
+    EXPECT_EQ(Outcome(whole, false, [&] { ReadFile(whole, "/proc/self/mem"); }),
               ReadError("/proc/self/mem", 0));
 }
 
