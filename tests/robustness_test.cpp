@@ -73,67 +73,47 @@ TEST(RobustnessTest, AMillionSiblings) {
     DestroyStringList(lines);
 }
 
-// Nesting is bounded by memory, not by the stack: 100,000 levels read whole,
-// and copying and merging them must not exhaust the stack.
-TEST(RobustnessTest, NestingFarTooDeep) {
-    ReportCapture capture;
-    const int levels = 100000;
+// "(n SubTree" lines `levels` deep, the leaf x = value, and the closing lines.
+std::string Nested(int levels, int value) {
     std::string opening, closing;
     for (int i = 0; i < levels; ++i) {
         opening += "(n SubTree\n";
         closing += ")\n";
     }
-    PTNSubTree tree("root");
-    tree.BuildFromString(
-        ("(first Integer 1)\n" + opening + "(leaf Integer 7)\n" + closing + "(after Integer 2)\n")
-            .c_str());
-    EXPECT_TRUE(capture.Texts().empty());
-    EXPECT_EQ(tree.GetChildAsInteger("after"), 2);
-    std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
-    copy->SetFrom(&tree, ExceptionList());
-    for (PTNSubTree* read : {&tree, copy.get()}) {
-        int depth = 0;
-        EXPECT_EQ(Innermost(read, depth)->GetChildAsInteger("leaf"), 7);
-        EXPECT_EQ(depth, levels);
-    }
+    return opening + "(x Integer " + std::to_string(value) + ")\n" + closing;
 }
 
-// `depth` nested subtrees named n, the innermost holding the leaf x = value.
-PTNSubTree* Chain(int depth, int value) {
-    auto* root = new PTNSubTree("n");
-    PTNSubTree* inner = root;
-    for (int level = 1; level < depth; ++level) {
-        inner->AddChild(new PTNSubTree("n"));
-        inner = static_cast<PTNSubTree*>(inner->GetChild("n"));
-    }
-    inner->AddChild(new PTNInteger("x", value));
-    return root;
-}
-
-// Deleting, copying, merging, assigning and writing deep chains, on a thread
-// whose 256 KB stack leaves no room for stack per level.
-TEST(RobustnessTest, DeepChainsOnASmallStack) {
+// Nesting is bounded by memory, not by the stack. On a thread whose 256 KB
+// stack leaves no room for stack per level, 100,000 levels read whole, and
+// copying, merging, assigning, writing and deleting deep trees work.
+TEST(RobustnessTest, NestingFarTooDeepOnASmallStack) {
+    ReportCapture capture;
     const size_t d = 5000;  // the written text grows with the square of the depth
     std::string written, joined, whole;
     int levels = 0;
     std::function<void()> work = [&] {
-        std::unique_ptr<PTNSubTree> tree(Chain(50000, 1)), copy(tree->DeepCopy());
+        PTNSubTree tree("root"), shallow("root");
+        tree.BuildFromString(
+            ("(first Integer 1)\n" + Nested(100000, 1) + "(after Integer 2)\n").c_str());
+        EXPECT_EQ(tree.GetChildAsInteger("after"), 2);
+        std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
         auto* leaf = dynamic_cast<PTNInteger*>(Innermost(copy.get(), levels)->GetChild("x"));
         ASSERT_NE(leaf, nullptr);
         leaf->SetValue(2);
         ExceptionList keepX;
         keepX.Add("X");
-        tree->SetFrom(copy.get(), keepX);
-        EXPECT_EQ(Innermost(tree.get(), levels)->GetChildAsInteger("x"), 1);
-        tree->SetFrom(copy.get(), ExceptionList());
+        tree.SetFrom(copy.get(), keepX);
+        EXPECT_EQ(Innermost(&tree, levels)->GetChildAsInteger("x"), 1);
+        tree.SetFrom(copy.get(), ExceptionList());
         PTNSubTree assigned("other");
-        assigned = *tree;
+        assigned = tree;
         EXPECT_EQ(Innermost(&assigned, levels)->GetChildAsInteger("x"), 2);
 
-        tree.reset(Chain(static_cast<int>(d), 7));
-        written = Captured([&](FILE* f) { tree->WriteToFile(f); });
-        whole = HeapText(tree->GetAsString()).get();
-        char** list = tree->GetAsStringList(0);
+        shallow.BuildFromString(Nested(static_cast<int>(d), 7).c_str());
+        auto* top = static_cast<PTNSubTree*>(shallow.GetChild("n"));
+        written = Captured([&](FILE* f) { top->WriteToFile(f); });
+        whole = HeapText(top->GetAsString()).get();
+        char** list = top->GetAsStringList(0);
         joined = HeapText(StringListToBuffer(list)).get();
         DestroyStringList(list);
     };
@@ -148,7 +128,8 @@ TEST(RobustnessTest, DeepChainsOnASmallStack) {
     ASSERT_EQ(pthread_create(&thread, &attributes, run, &work), 0);
     pthread_join(thread, nullptr);
     pthread_attr_destroy(&attributes);
-    EXPECT_EQ(levels, 3 * 49999);  // the levels below the top of three chains
+    EXPECT_TRUE(capture.Texts().empty());
+    EXPECT_EQ(levels, 3 * 100000);  // every level of three trees
 
     // Per level an opening line of 2L + 10 characters and a closing line of
     // 2L + 1, each with its '\n'; the leaf line 2 * depth + 13 and its '\n'.
