@@ -493,9 +493,8 @@ TEST_F(ReaderTest, SourcesThroughIncludesCopiesMergesAndRereads) {
     auto other = Read("\n\n(s SubTree\n(deep Integer 30)\n)\n");
     tree.SetFrom(other.get(), ExceptionList());
     EXPECT_EQ(Text(*deep) + " " + Where(deep), "30 2 leaf.cfg@1 mid.cfg@3 main.cfg@0");
-    EXPECT_EQ(
-        Where(other->Find("s/deep")) + ", " + Where(&*std::make_unique<PTNInteger>("made", 1)),
-        "4 Memory@0, 0");  // the last not built by the reader
+    PTNInteger made("made", 1);  // not built by the reader
+    EXPECT_EQ(Where(other->Find("s/deep")) + ", " + Where(&made), "4 Memory@0, 0");
 }
 
 }  // namespace
