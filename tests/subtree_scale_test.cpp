@@ -34,10 +34,17 @@ std::vector<DWXParseTreeNode*> Children(const PTNSubTree& tree) {
     return children;
 }
 
+std::string Upper(std::string text) {
+    for (char& c : text) {
+        c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
+    }
+    return text;
+}
+
 // The answers of a walk of the children, in order.
 DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char* type) {
     for (DWXParseTreeNode* child : Children(tree)) {
-        if (child->GetName() && _stricmp(child->GetName(), name) == 0 &&
+        if (name && child->GetName() && _stricmp(child->GetName(), name) == 0 &&
             (!type || _stricmp(child->GetClassName(), type) == 0)) {
             return child;
         }
@@ -45,42 +52,88 @@ DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char*
     return nullptr;
 }
 
-int WalkCount(const PTNSubTree& tree, const char* name) {
-    int count = 0;
+// A few names and, with `all`, every name of a child in its own and in upper case:
+// the index answers as a walk of the children does.
+void ExpectLookupsAgree(const PTNSubTree& tree, const std::string& step, bool all = true) {
+    std::vector<std::string> names(std::begin(kNames), std::end(kNames));
     for (DWXParseTreeNode* child : Children(tree)) {
-        count += child->GetName() && _stricmp(child->GetName(), name) == 0;
+        if (all && child->GetName()) {
+            names.insert(names.end(), {child->GetName(), Upper(child->GetName())});
+        }
     }
-    return count;
-}
-
-void ExpectLookupsAgree(const PTNSubTree& tree, const std::string& step) {
-    for (const char* name : kNames) {
-        ASSERT_EQ(tree.GetNumberOfOccurence(name), WalkCount(tree, name)) << step << " " << name;
+    for (const std::string& name : names) {
+        int count = 0;
+        for (DWXParseTreeNode* child : Children(tree)) {
+            count += child->GetName() && _stricmp(child->GetName(), name.c_str()) == 0;
+        }
+        ASSERT_EQ(tree.GetNumberOfOccurence(name.c_str()), count) << step << " " << name;
         for (const char* type : kTypes) {
-            ASSERT_EQ(tree.GetChild(name, type), WalkFind(tree, name, type))
+            ASSERT_EQ(tree.GetChild(name.c_str(), type), WalkFind(tree, name.c_str(), type))
                 << step << " " << name << " " << (type ? type : "any");
         }
-        auto* first = dynamic_cast<PTNInteger*>(WalkFind(tree, name, nullptr));
-        ASSERT_EQ(tree.GetChildAsInteger(name), first ? first->GetValue() : 0) << step;
+        auto* first = dynamic_cast<PTNInteger*>(WalkFind(tree, name.c_str(), nullptr));
+        ASSERT_EQ(tree.GetChildAsInteger(name.c_str()), first ? first->GetValue() : 0) << step;
     }
 }
 
-DWXParseTreeNode* NewNode(std::mt19937& random, int value) {
-    const char* name = kNames[random() % 8];
+// Names of the fixed set, or of 1 to 20 letters of three in mixed case, so
+// that the index keeps meeting new names and names of every word length.
+std::string NewName(std::mt19937& random) {
+    if (random() % 2) {
+        return kNames[random() % 8];
+    }
+    std::string name(random() % 20 + 1, 'x');
+    for (char& c : name) {
+        c = "abcABC"[random() % 6];
+    }
+    return name;
+}
+
+// A leaf, or a subtree holding `depth` levels of three such nodes.
+DWXParseTreeNode* NewNode(std::mt19937& random, int value, int depth = 1) {
+    const std::string name = NewName(random);
     switch (random() % 3) {
         case 0:
-            return new PTNInteger(name, value);
+            return new PTNInteger(name.c_str(), value);
         case 1:
-            return new PTNString(name, "s");
-        default:
-            return new PTNSubTree(name);
+            return new PTNString(name.c_str(), std::to_string(value).c_str());
+    }
+    auto* tree = new PTNSubTree(name.c_str());
+    for (int i = 0; i < depth * 3; ++i) {
+        tree->AddChild(NewNode(random, value + i, depth - 1));
+    }
+    return tree;
+}
+
+// A merge as the plain recursive walk does it.
+void ReferenceMerge(PTNSubTree& tree, PTNSubTree& other, const ExceptionList& exceptions) {
+    for (DWXParseTreeNode* child : Children(tree)) {
+        if (exceptions.IsMember(child->GetName())) {
+            continue;
+        }
+        DWXParseTreeNode* source = WalkFind(other, child->GetName(), nullptr);
+        auto* subtree = dynamic_cast<PTNSubTree*>(child);
+        auto* sourceSubtree = dynamic_cast<PTNSubTree*>(source);
+        if (subtree && sourceSubtree) {
+            ReferenceMerge(*subtree, *sourceSubtree, exceptions);
+        } else if (!subtree && source) {
+            child->SetFrom(source);
+        }
     }
 }
 
 // Random appends, renames, deletions by hand, moves between two trees,
-// copies and assignments, on trees below and far above the index threshold:
-// after every step both trees answer as a walk does.
-TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
+// copies, merges and assignments, on trees below and far above the index
+// threshold: after every step both trees answer as a walk does, and every
+// merge does what the recursive walk does.
+TEST(SubTreeIndexTest, LookupsAndMergesAgreeWithAWalkThroughEveryChange) {
+    ExceptionList lists[3];  // none, a few, and more than a walk of the list suits
+    for (const char* name : {"WIDTH", "one", "two"}) {  // the roots are never compared
+        lists[1].Add(name);
+    }
+    for (const char* name : {"A", "B", "LONG_NAME_X", "f1", "f2", "f3", "f4", "f5", "f6", "f7"}) {
+        lists[2].Add(name);
+    }
     for (int size : {4, 12, 300}) {
         std::mt19937 random(static_cast<unsigned>(size));
         PTNSubTree one("one"), two("two");
@@ -101,7 +154,7 @@ TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
                 case 1:
                 case 2:
                     if (some) {
-                        some->SetName(random() % 9 ? kNames[random() % 8] : nullptr);
+                        some->SetName(random() % 9 ? NewName(random).c_str() : nullptr);
                     }
                     break;
                 case 3:
@@ -111,9 +164,14 @@ TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
                     other.AddChild(some);  // moved, not shared
                     break;
                 case 5:
-                    if (step % 50 == 5) {
-                        std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
+                    if (step % 20 == 5) {  // merged into a copy, then assigned
+                        const ExceptionList& exceptions = lists[step % 3];
+                        std::unique_ptr<PTNSubTree> copy(tree.DeepCopy()),
+                            expected(tree.DeepCopy());
                         ExpectLookupsAgree(*copy, "copy");
+                        copy->SetFrom(&other, exceptions);
+                        ReferenceMerge(*expected, other, exceptions);
+                        ASSERT_EQ(Text(*copy), Text(*expected));
                         other = *copy;
                     }
                     break;
@@ -121,162 +179,9 @@ TEST(SubTreeIndexTest, LookupsAgreeWithAWalkThroughEveryChange) {
                     tree.AddChild(some);  // its own child goes to the end
                     break;
             }
-            ExpectLookupsAgree(one, "one, step " + std::to_string(step));
-            ExpectLookupsAgree(two, "two, step " + std::to_string(step));
+            ExpectLookupsAgree(one, "one, step " + std::to_string(step), step % 20 == 0);
+            ExpectLookupsAgree(two, "two, step " + std::to_string(step), step % 20 == 0);
         }
-    }
-}
-
-// Names that keep arriving after the index is built, by append and by
-// rename, outgrow its table again and again; every name is still found once.
-TEST(SubTreeIndexTest, NewNamesAfterTheIndexIsBuiltAreAllFound) {
-    PTNSubTree tree("t");
-    std::vector<std::string> names;
-    for (int i = 0; i < 600; ++i) {
-        names.push_back("n" + std::to_string(i));
-        tree.AddChild(new PTNInteger(i % 3 ? names.back().c_str() : "r", i));
-        if (i % 3 == 0) {
-            tree.GetChild("r")->SetName(names.back().c_str());  // the one just added
-        }
-        ASSERT_EQ(tree.GetChildAsInteger(names.back().c_str()), i);  // builds the index at 9
-    }
-    for (int i = 0; i < 600; ++i) {
-        ASSERT_EQ(tree.GetChildAsInteger(names[static_cast<size_t>(i)].c_str()), i);
-        ASSERT_EQ(tree.GetNumberOfOccurence(names[static_cast<size_t>(i)].c_str()), 1) << i;
-    }
-}
-
-// The index reads names a word at a time with a tail of up to seven bytes:
-// names of every length that differ in a single byte, wherever it lies, are
-// told apart, and found again whatever the case of their letters.
-TEST(SubTreeIndexTest, NamesOfEveryLengthDifferingInAnyOneByte) {
-    const std::string letters = "abcdefghijklmnopqrstu";
-    PTNSubTree tree("t");
-    std::vector<std::pair<std::string, int>> names;
-    for (int length = 1; length <= 20; ++length) {
-        const std::string name = letters.substr(0, static_cast<size_t>(length));
-        names.emplace_back(name, length * 100);
-        for (int at = 0; at < length; ++at) {
-            std::string changed = name;
-            changed[static_cast<size_t>(at)] = '#';
-            names.emplace_back(changed, length * 100 + at + 1);
-        }
-    }
-    for (const auto& name : names) {
-        tree.AddChild(new PTNInteger(name.first.c_str(), name.second));
-    }
-    for (const auto& name : names) {
-        std::string upper = name.first;
-        for (char& c : upper) {
-            c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
-        }
-        EXPECT_EQ(tree.GetChildAsInteger(name.first.c_str()), name.second) << name.first;
-        EXPECT_EQ(tree.GetChildAsInteger(upper.c_str()), name.second) << upper;
-        EXPECT_EQ(tree.GetNumberOfOccurence(upper.c_str()), 1) << upper;
-    }
-    EXPECT_EQ(tree.GetChild("abcdefgh$"), nullptr);
-}
-
-TEST(SubTreeIndexTest, MovedAndDeletedNodesLeaveNoDanglingPointers) {
-    auto* source = new PTNSubTree("source");
-    PTNSubTree target("target");
-    for (int i = 0; i < 20; ++i) {
-        source->AddChild(new PTNInteger(i % 2 ? "odd" : "even", i));
-    }
-    DWXParseTreeNode* moved = source->GetChild("odd");
-    target.AddChild(moved);
-    EXPECT_EQ(moved->GetParentRef(), &target);
-    EXPECT_EQ(source->GetNumberOfOccurence("odd"), 9);
-    EXPECT_EQ(source->GetChildAsInteger("odd"), 3);
-
-    delete source->GetChild("even");  // by hand: the parent lets go of it
-    EXPECT_EQ(source->GetChildAsInteger("even"), 2);
-    EXPECT_EQ(source->GetChildren()->GetCount(), 18);
-
-    // A subtree cannot hold itself or an ancestor.
-    auto* inner = new PTNSubTree("inner");
-    source->AddChild(inner);
-    inner->AddChild(source);
-    inner->AddChild(inner);
-    EXPECT_EQ(inner->GetChildren()->GetCount(), 0);
-
-    target.AddChild(source);  // a whole subtree moves too
-    delete source;
-    EXPECT_EQ(target.GetChildAsInteger("odd"), 1);
-    EXPECT_EQ(target.GetChildren()->GetCount(), 1);
-}
-
-// A merge as the plain recursive walk does it.
-void ReferenceMerge(PTNSubTree& tree, PTNSubTree& other, const ExceptionList& exceptions) {
-    for (DWXParseTreeNode* child : Children(tree)) {
-        if (exceptions.IsMember(child->GetName())) {
-            continue;
-        }
-        DWXParseTreeNode* source = WalkFind(other, child->GetName(), nullptr);
-        auto* subtree = dynamic_cast<PTNSubTree*>(child);
-        auto* sourceSubtree = dynamic_cast<PTNSubTree*>(source);
-        if (subtree && sourceSubtree) {
-            ReferenceMerge(*subtree, *sourceSubtree, exceptions);
-        } else if (!subtree && source) {
-            child->SetFrom(source);
-        }
-    }
-}
-
-// Two levels of `width` children with namesakes of mixed case and class.
-std::unique_ptr<PTNSubTree> MergeTree(int width, int seed, int depth = 2) {
-    std::mt19937 random(static_cast<unsigned>(seed));
-    auto tree = std::make_unique<PTNSubTree>("root");
-    for (int i = 0; i < width; ++i) {
-        std::string name = std::string(kNames[random() % 8]) + std::to_string(random() % 4);
-        if (depth > 1 && random() % 4 == 0) {
-            std::unique_ptr<PTNSubTree> below = MergeTree(width, seed + i, depth - 1);
-            below->SetName(name.c_str());
-            tree->AddChild(below.release());
-        } else if (random() % 2) {
-            tree->AddChild(new PTNInteger(name.c_str(), static_cast<int>(random() % 100)));
-        } else {
-            tree->AddChild(new PTNString(name.c_str(), std::to_string(seed).c_str()));
-        }
-    }
-    return tree;
-}
-
-TEST(SubTreeMergeTest, AgreesWithARecursiveWalkOnSmallAndLargeTrees) {
-    ExceptionList none, few, many;
-    few.Add("B1");
-    for (const char* name : kNames) {  // more names than a walk of the list suits
-        std::string upper(name);
-        for (char& c : upper) {
-            c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
-        }
-        many.Add((upper + "2").c_str());
-        many.Add((upper + "9").c_str());
-    }
-    for (int width : {5, 60}) {
-        for (const ExceptionList* exceptions : {&none, &few, &many}) {
-            std::unique_ptr<PTNSubTree> mine = MergeTree(width, 1), expected = MergeTree(width, 1);
-            std::unique_ptr<PTNSubTree> theirs = MergeTree(width, 2);
-            mine->SetFrom(theirs.get(), *exceptions);
-            ReferenceMerge(*expected, *theirs, *exceptions);
-            EXPECT_EQ(Shape(mine.get(), true), Shape(expected.get(), true)) << width;
-            if (width > 5) {  // the large trees share names, so the merge changes them
-                EXPECT_NE(Shape(mine.get(), true), Shape(MergeTree(width, 1).get(), true));
-            }
-        }
-    }
-}
-
-// Short string values live in the node: every length around the boundary
-// must survive setting, copying and setting from the node's own value.
-TEST(NodePoolTest, StringValuesOfEveryLengthAroundTheInlineSize) {
-    for (size_t length = 0; length < 40; ++length) {
-        std::string value(length, 'v');
-        PTNString node("s", value.c_str());
-        std::unique_ptr<DWXParseTreeNode> copy(node.Copy());
-        EXPECT_EQ(static_cast<PTNString*>(copy.get())->GetValue(), value);
-        node.SetValue(node.GetValue() + (length > 0));  // a tail of its own value
-        EXPECT_EQ(std::string(node.GetValue()), value.substr(length > 0));
     }
 }
 
@@ -285,29 +190,30 @@ struct BigNode : PTNInteger {  // larger than the pool carves
     char pad[4096];
 };
 
-// Builds, checks and deletes trees; half of them are deleted by another thread.
-void BuildAndDelete(int seed, std::vector<PTNSubTree*>& handOver) {
-    for (int round = 0; round < 20; ++round) {
-        auto* tree = new PTNSubTree("t");
-        for (int i = 0; i < 500; ++i) {
-            tree->AddChild(new PTNInteger(std::to_string(i).c_str(), seed + i));
-        }
-        tree->AddChild(new BigNode);
-        ASSERT_EQ(tree->GetChildAsInteger("499"), seed + 499);
-        ASSERT_EQ(tree->GetChildAsInteger("big"), 7);
-        if (round % 2) {
-            handOver.push_back(tree);
-        } else {
-            delete tree;
-        }
-    }
-}
+// Trees built on four threads, half of them deleted on the main thread; and
+// a node made by a thread-local destructor that runs after the pool let go
+// of the thread's slab.
+struct LateMaker {
+    ~LateMaker() { delete new PTNInteger("late", 1); }
+};
 
 TEST(NodePoolTest, TreesOnSeparateThreadsAndDeletedOnAnother) {
     std::vector<std::vector<PTNSubTree*>> handOver(4);
     std::vector<std::thread> threads;
     for (int t = 0; t < 4; ++t) {
-        threads.emplace_back(BuildAndDelete, t * 1000, std::ref(handOver[static_cast<size_t>(t)]));
+        threads.emplace_back([t, &trees = handOver[static_cast<size_t>(t)]] {
+            thread_local LateMaker maker;
+            (void)&maker;
+            for (int round = 0; round < 20; ++round) {
+                auto* tree = new PTNSubTree("t");
+                for (int i = 0; i < 500; ++i) {
+                    tree->AddChild(new PTNInteger(std::to_string(i).c_str(), t + i));
+                }
+                tree->AddChild(new BigNode);
+                EXPECT_EQ(tree->GetChildAsInteger("499") + tree->GetChildAsInteger("big"), t + 506);
+                round % 2 ? trees.push_back(tree) : delete tree;
+            }
+        });
     }
     for (std::thread& thread : threads) {
         thread.join();
@@ -319,37 +225,17 @@ TEST(NodePoolTest, TreesOnSeparateThreadsAndDeletedOnAnother) {
     }
 }
 
-// A node made by a thread-local destructor that runs after the pool let go
-// of the thread's slab still comes and goes safely.
-struct LateMaker {
-    ~LateMaker() { delete new PTNInteger("late", 1); }
-};
-
-TEST(NodePoolTest, NodesMadeAsAThreadEnds) {
-    std::thread([] {
-        thread_local LateMaker maker;
-        (void)&maker;
-        delete new PTNInteger("early", 1);
-    }).join();
-}
-
 #if defined(__GLIBC__)
-// Deleting a tree gives its memory back to the C heap: reading and deleting
-// a large tree again and again does not grow the heap.
+// Reading and deleting a large tree again and again does not grow the heap.
 TEST(NodePoolTest, DeletedTreesGiveTheirMemoryBack) {
     std::string text = "(root SubTree\n";
     for (int i = 0; i < 20000; ++i) {
         text += "  (n" + std::to_string(i) + " String \"value " + std::to_string(i) + "\")\n";
     }
-    auto cycle = [&text] {
-        PTNSubTree tree("t");
-        tree.BuildFromString(text.c_str());
-        ASSERT_EQ(tree.GetChildren()->GetCount(), 1);
-    };
-    cycle();
-    const size_t before = mallinfo2().uordblks;
-    for (int i = 0; i < 5; ++i) {
-        cycle();
+    size_t before = 0;
+    for (int i = 0; i < 6; ++i) {
+        PTNSubTree(nullptr).BuildFromString(text.c_str());
+        before = i == 0 ? mallinfo2().uordblks : before;
     }
     EXPECT_LT(mallinfo2().uordblks, before + 256 * 1024);
 }
