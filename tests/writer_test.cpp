@@ -67,7 +67,7 @@ TEST(WriterTest, EveryKindItsLineAndReadingBack) {
         const char* line;
         bool read;
     } rows[] = {
-        {new PTNSubTree("t"), PTNKind::kSubTree, "(t SubTree", true},
+        {new PTNSubTree("t"), PTNKind::kSubTree, "(t SubTree\n  )", true},
         {new PTNBool("b", 3), PTNKind::kBool, "(b Bool TRUE)", true},
         {new PTNChar("c", 'Q'), PTNKind::kChar, "(c Char Q)", true},
         {new PTNChar("c0", 0), PTNKind::kChar, "(c0 Char )", false},
@@ -92,14 +92,11 @@ TEST(WriterTest, EveryKindItsLineAndReadingBack) {
     for (const auto& row : rows) {
         tree.AddChild(row.node);
         const std::string line = "  " + std::string(row.line) + "\n";
-        const size_t at = line.find(' ', 3) + 1;
         EXPECT_EQ(PTNKindOf(row.node), row.kind) << row.line;
-        EXPECT_EQ(PTNTypeKeyword(row.node->GetClassName()),
-                  line.substr(at, line.find_first_of(" \n", at) - at));
-        written += line + (row.kind == PTNKind::kSubTree ? "  )\n" : "");
+        written += line;
         if (row.read) {
             readable.AddChild(row.node->Copy());
-            read += line + (row.kind == PTNKind::kSubTree ? "  )\n" : "");
+            read += line;
         }
     }
     EXPECT_EQ(Text(tree), written + ")\n");
