@@ -25,37 +25,10 @@ std::string Lines(const PTNSubTree& tree, int level = 0) {
     return lines;
 }
 
-TEST(WriterTest, SubtreesAndIndents) {
-    PTNSubTree config("config");
-    auto* colors = new PTNSubTree("colors");
-    config.AddChild(new PTNInteger("width", 640));
-    config.AddChild(new PTNString("title", "Main window"));
-    config.AddChild(colors);
-    colors->AddChild(new PTNString("fg", "red"));
-    colors->AddChild(new PTNSubTree("empty"));
-    const std::string lines =
-        "(config SubTree|  (width Integer 640)|  (title String \"Main window\")|"
-        "  (colors SubTree|    (fg String \"red\")|    (empty SubTree|    )|  )|)|";
-    EXPECT_EQ(Lines(config), lines);
-    EXPECT_EQ(Lines(config, -1), lines);
-    EXPECT_EQ(Lines(*colors, 2),
-              "    (colors SubTree|      (fg String \"red\")|      (empty SubTree|      )|    )|");
-
-    std::string expected = lines;
-    for (char& c : expected) {
-        c = c == '|' ? '\n' : c;
-    }
-    EXPECT_EQ(Captured([&](FILE* f) { fputs("before\n", f), config.WriteToFile(f); }),
-              "before\n" + expected);
-    // A child deleted by hand leaves an empty slot behind, which writes nothing.
-    delete config.GetChild("title");
-    const std::string title = "  (title String \"Main window\")\n";
-    EXPECT_EQ(Text(config), expected.erase(expected.find(title), title.size()));
-}
-
 // Each kind: its line, the kind PTNKindOf names, and whether reading the line
 // gives the same line again (Float and the integer lists are never read; a
-// null string, an empty Char or Base64 and a nameless leaf read otherwise).
+// null string, an empty Char or Base64 and a nameless leaf read otherwise);
+// the whole as lists at any indent, a buffer and a stream.
 TEST(WriterTest, EveryKindItsLineAndReadingBack) {
     const int ints[] = {1, -2};
     const double doubles[] = {1.5, -2};
@@ -67,7 +40,14 @@ TEST(WriterTest, EveryKindItsLineAndReadingBack) {
         const char* line;
         bool read;
     } rows[] = {
-        {new PTNSubTree("t"), PTNKind::kSubTree, "(t SubTree\n  )", true},
+        {[] {
+             auto* subtree = new PTNSubTree("t");
+             subtree->AddChild(new PTNString("fg", "red"));
+             subtree->AddChild(new PTNSubTree("e"));
+             return subtree;
+         }(),
+         PTNKind::kSubTree, "(t SubTree\n    (fg String \"red\")\n    (e SubTree\n    )\n  )",
+         true},
         {new PTNBool("b", 3), PTNKind::kBool, "(b Bool TRUE)", true},
         {new PTNChar("c", 'Q'), PTNKind::kChar, "(c Char Q)", true},
         {new PTNChar("c0", 0), PTNKind::kChar, "(c0 Char )", false},
@@ -99,9 +79,22 @@ TEST(WriterTest, EveryKindItsLineAndReadingBack) {
             read += line;
         }
     }
-    EXPECT_EQ(Text(tree), written + ")\n");
+    std::string lines = written + ")\n";
+    EXPECT_EQ(Text(tree), lines);
+    EXPECT_EQ(Captured([&](FILE* f) { fputs("before\n", f), tree.WriteToFile(f); }),
+              "before\n" + lines);
     EXPECT_EQ(Rewritten(readable), read + ")\n");
-    EXPECT_EQ(Text(*std::unique_ptr<PTNSubTree>(tree.DeepCopy())), Text(tree));
+    EXPECT_EQ(Text(*std::unique_ptr<PTNSubTree>(tree.DeepCopy())), lines);
+    for (char& c : lines) {
+        c = c == '\n' ? '|' : c;
+    }
+    EXPECT_EQ(Lines(tree), lines);
+    EXPECT_EQ(Lines(tree, -1), lines);
+    EXPECT_EQ(Lines(*static_cast<PTNSubTree*>(rows[0].node), 2),
+              "    (t SubTree|      (fg String \"red\")|      (e SubTree|      )|    )|");
+    // A child deleted by hand leaves an empty slot behind, which writes nothing.
+    delete rows[1].node;
+    EXPECT_EQ(Text(tree), written.erase(written.find("  (b Bool"), 16) + ")\n");
     EXPECT_EQ(PTNKindOf(nullptr), PTNKind::kOther);
     EXPECT_STREQ(PTNTypeKeyword(nullptr), "");
     EXPECT_STREQ(PTNTypeKeyword("Ab"), "Ab");
