@@ -107,6 +107,7 @@ TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
                  {&list, &list, "1 2"},
                  {&list, &same, "5 6 7"},
                  {&someDoubles, &noDoubles, "9.5"},
+                 {&someDoubles, &list, "9.5"},
                  {&strings, &list, "\"keep\""},
                  {&strings, &strings, "\"keep\""},
                  {&strings, &noStrings, ""},

@@ -1,5 +1,4 @@
 // The writer: exact line formats and indents, as lists, a buffer and a stream.
-#include "../fuzz/tree_rewrite.h"
 #include "container_test_util.h"
 #include "tree_test_util.h"
 
@@ -8,6 +7,7 @@
 #include <services/rtprim.h>
 #include <services/utilhub.h>
 
+#include <limits.h>
 #include <stdio.h>
 
 #include <memory>
@@ -25,11 +25,9 @@ std::string Lines(const PTNSubTree& tree, int level = 0) {
     return lines;
 }
 
-// Each kind: its line, the kind PTNKindOf names, and whether reading the line
-// gives the same line again (Float and the integer lists are never read; a
-// null string, an empty Char or Base64 and a nameless leaf read otherwise);
-// the whole as lists at any indent, a buffer and a stream.
-TEST(WriterTest, EveryKindItsLineAndReadingBack) {
+// Each kind: its line and the kind PTNKindOf names; the whole as lists at any
+// indent, a buffer and a stream.
+TEST(WriterTest, EveryKindItsLine) {
     const int ints[] = {1, -2};
     const double doubles[] = {1.5, -2};
     const unsigned char bytes[] = {'a', 'b'};
@@ -38,7 +36,6 @@ TEST(WriterTest, EveryKindItsLineAndReadingBack) {
         DWXParseTreeNode* node;
         PTNKind kind;
         const char* line;
-        bool read;
     } rows[] = {
         {[] {
              auto* subtree = new PTNSubTree("t");
@@ -46,44 +43,41 @@ TEST(WriterTest, EveryKindItsLineAndReadingBack) {
              subtree->AddChild(new PTNSubTree("e"));
              return subtree;
          }(),
-         PTNKind::kSubTree, "(t SubTree\n    (fg String \"red\")\n    (e SubTree\n    )\n  )",
-         true},
-        {new PTNBool("b", 3), PTNKind::kBool, "(b Bool TRUE)", true},
-        {new PTNChar("c", 'Q'), PTNKind::kChar, "(c Char Q)", true},
-        {new PTNChar("c0", 0), PTNKind::kChar, "(c0 Char )", false},
-        {new PTNInteger("i", 7), PTNKind::kInteger, "(i Integer 7)", true},
-        {new PTNFloat("f", 0.5f), PTNKind::kFloat, "(f Float 0.500000)", false},
-        {new PTNDouble("d", 0.1), PTNKind::kDouble, "(d Double 0.1)", true},
-        {new PTNString("s", "a\"b"), PTNKind::kString, "(s String \"a\\qb\")", true},
-        {new PTNString("n", nullptr), PTNKind::kString, "(n String \\q\\q)", false},
-        {new PTNStringList("sl", entries), PTNKind::kStringList, "(sl StringList \"x\" \"y z\")",
-         true},
-        {new PTNStringList("sl0", nullptr), PTNKind::kStringList, "(sl0 StringList )", true},
-        {new PTNIntegerList("il", 2, ints), PTNKind::kIntegerList, "(il IntegerList 1 -2)", false},
+         PTNKind::kSubTree, "(t SubTree\n    (fg String \"red\")\n    (e SubTree\n    )\n  )"},
+        {new PTNBool("b", 3), PTNKind::kBool, "(b Bool TRUE)"},
+        {new PTNBool("no", 0), PTNKind::kBool, "(no Bool FALSE)"},
+        {new PTNInteger("min", INT_MIN), PTNKind::kInteger, "(min Integer -2147483648)"},
+        {new PTNDouble("w", 640), PTNKind::kDouble, "(w Double 640)"},
+        {new PTNDouble("z", -0.0), PTNKind::kDouble, "(z Double -0)"},
+        {new PTNChar("c", 'Q'), PTNKind::kChar, "(c Char Q)"},
+        {new PTNChar("c0", 0), PTNKind::kChar, "(c0 Char )"},
+        {new PTNInteger("i", 7), PTNKind::kInteger, "(i Integer 7)"},
+        {new PTNFloat("f", 0.5f), PTNKind::kFloat, "(f Float 0.500000)"},
+        {new PTNDouble("d", 0.1), PTNKind::kDouble, "(d Double 0.1)"},
+        {new PTNString("s", "a\"b"), PTNKind::kString, "(s String \"a\\qb\")"},
+        {new PTNString("n", nullptr), PTNKind::kString, "(n String \\q\\q)"},
+        {new PTNStringList("sl", entries), PTNKind::kStringList, "(sl StringList \"x\" \"y z\")"},
+        {new PTNStringList("sl0", nullptr), PTNKind::kStringList, "(sl0 StringList )"},
+        {new PTNIntegerList("il", 2, ints), PTNKind::kIntegerList, "(il IntegerList 1 -2)"},
         {new PTNInteger32List("i32", 2, ints), PTNKind::kInteger32List,
-         "(i32 Integer32List 1.000000 -2.000000)", false},
-        {new PTNDoubleList("dl", 2, doubles), PTNKind::kDoubleList, "(dl DoubleList 1.5 -2)", true},
-        {new PTNBase64("b64", bytes, 2), PTNKind::kBase64, "(b64 Base64 YWI=)", true},
-        {new PTNBase64("b0", nullptr, 0), PTNKind::kBase64, "(b0 Base64 )", false},
-        {new PTNInteger(nullptr, 1), PTNKind::kInteger, "( Integer 1)", false},
+         "(i32 Integer32List 1.000000 -2.000000)"},
+        {new PTNDoubleList("dl", 2, doubles), PTNKind::kDoubleList, "(dl DoubleList 1.5 -2)"},
+        {new PTNBase64("b64", bytes, 2), PTNKind::kBase64, "(b64 Base64 YWI=)"},
+        {new PTNBase64("b0", nullptr, 0), PTNKind::kBase64, "(b0 Base64 )"},
+        {new PTNInteger(nullptr, 1), PTNKind::kInteger, "( Integer 1)"},
     };
-    PTNSubTree tree("all"), readable("all");
-    std::string written = "(all SubTree\n", read = written;
+    PTNSubTree tree("all");
+    std::string written = "(all SubTree\n";
     for (const auto& row : rows) {
         tree.AddChild(row.node);
         const std::string line = "  " + std::string(row.line) + "\n";
         EXPECT_EQ(PTNKindOf(row.node), row.kind) << row.line;
         written += line;
-        if (row.read) {
-            readable.AddChild(row.node->Copy());
-            read += line;
-        }
     }
     std::string lines = written + ")\n";
     EXPECT_EQ(Text(tree), lines);
     EXPECT_EQ(Captured([&](FILE* f) { fputs("before\n", f), tree.WriteToFile(f); }),
               "before\n" + lines);
-    EXPECT_EQ(Rewritten(readable), read + ")\n");
     EXPECT_EQ(Text(*std::unique_ptr<PTNSubTree>(tree.DeepCopy())), lines);
     for (char& c : lines) {
         c = c == '\n' ? '|' : c;
