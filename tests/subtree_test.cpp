@@ -1,179 +1,256 @@
-// The subtree: ownership, lookups and typed readers, deep copies, and the
-// merge under an exception list.
+// The subtree: lookups through the name index must answer exactly as a walk
+// of the children does, through every change a host can make; merges must do
+// what a plain recursive merge does; copies, typed readers and paths; and
+// pooled nodes must be deleted, moved and freed safely, from any thread.
 #include "tree_test_util.h"
 
 #include <dwxcore/dwxparse.h>
 #include <gtest/gtest.h>
+#include <services/portability.h>
 
-#include <stdlib.h>
+#if defined(__GLIBC__)
+#include <malloc.h>
+#endif
 
-#include <initializer_list>
+#include <ctype.h>
+
 #include <memory>
+#include <random>
 #include <string>
+#include <thread>
+#include <vector>
 
 namespace {
 
-// An integer leaf that counts its destructions.
-struct CountingNode : PTNInteger {
-    static int destroyed;
-    CountingNode(const char* name, int value) : PTNInteger(name, value) {}
-    ~CountingNode() override { ++destroyed; }
-};
-int CountingNode::destroyed = 0;
+const char* const kNames[] = {"a", "A", "b", "width", "WIDTH", "Width", "long_name_x", "c"};
+const char* const kTypes[] = {nullptr, "PTNInteger", "ptnstring", "PTNSubTree", "Integer"};
 
-template <class Tree>
-Tree* With(Tree* tree, std::initializer_list<DWXParseTreeNode*> children) {
-    for (DWXParseTreeNode* child : children) {
-        tree->AddChild(child);
+// The children as the range-for gives them; the index is not used.
+std::vector<DWXParseTreeNode*> Children(const PTNSubTree& tree) {
+    std::vector<DWXParseTreeNode*> children;
+    for (DWXParseTreeNode* child : tree) {
+        children.push_back(child);
+    }
+    return children;
+}
+
+// The first child a walk finds by name, and class when given.
+DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char* type) {
+    for (DWXParseTreeNode* child : Children(tree)) {
+        if (name && child->GetName() && _stricmp(child->GetName(), name) == 0 &&
+            (!type || _stricmp(child->GetClassName(), type) == 0)) {
+            return child;
+        }
+    }
+    return nullptr;
+}
+
+void ExpectParents(const PTNSubTree& tree) {
+    for (DWXParseTreeNode* child : Children(tree)) {
+        ASSERT_EQ(child->GetParentRef(), &tree);
+        if (auto* subtree = dynamic_cast<PTNSubTree*>(child)) {
+            ExpectParents(*subtree);
+        }
+    }
+}
+
+// Every parent link holds; a few names and, with `all`, every name of a child in its own and in
+// upper case: the index answers as a walk of the children does.
+void ExpectLookupsAgree(const PTNSubTree& tree, const std::string& step, bool all = true) {
+    std::vector<std::string> names(std::begin(kNames), std::end(kNames));
+    ExpectParents(tree);
+    for (DWXParseTreeNode* child : Children(tree)) {
+        if (all && child->GetName()) {
+            names.push_back(child->GetName());
+            for (char& c : names.back()) {
+                c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
+            }
+        }
+    }
+    for (const std::string& name : names) {
+        int count = 0;
+        for (DWXParseTreeNode* child : Children(tree)) {
+            count += child->GetName() && _stricmp(child->GetName(), name.c_str()) == 0;
+        }
+        ASSERT_EQ(tree.GetNumberOfOccurence(name.c_str()), count) << step << " " << name;
+        for (const char* type : kTypes) {
+            ASSERT_EQ(tree.GetChild(name.c_str(), type), WalkFind(tree, name.c_str(), type))
+                << step << " " << name << " " << (type ? type : "any");
+        }
+        auto* first = WalkFind(tree, name.c_str(), nullptr);
+        auto* number = dynamic_cast<PTNInteger*>(first);
+        auto* text = dynamic_cast<PTNString*>(first);
+        ASSERT_EQ(tree.GetChildAsInteger(name.c_str()), number ? number->GetValue() : 0) << step;
+        ASSERT_STREQ(tree.GetChildAsString(name.c_str()), text ? text->GetValue() : "") << step;
+    }
+}
+
+// A name of the fixed set, or of 1 to 20 letters in mixed case, so that the
+// index keeps meeting new names and names of every word length.
+std::string NewName(std::mt19937& random) {
+    if (random() % 2) {
+        return kNames[random() % 8];
+    }
+    std::string name(random() % 20 + 1, 'x');
+    for (char& c : name) {
+        c = "abcABC"[random() % 6];
+    }
+    return name;
+}
+
+// A leaf, or a subtree holding `depth` levels of three such nodes.
+DWXParseTreeNode* NewNode(std::mt19937& random, int value, int depth = 1) {
+    const std::string name = NewName(random);
+    switch (random() % 3) {
+        case 0:
+            return new PTNInteger(name.c_str(), value);
+        case 1:
+            return new PTNString(name.c_str(), std::to_string(value).c_str());
+    }
+    auto* tree = new PTNSubTree(name.c_str());
+    for (int i = 0; i < depth * 3; ++i) {
+        tree->AddChild(NewNode(random, value + i, depth - 1));
     }
     return tree;
 }
 
-TEST(SubTreeTest, OwnsAndDeletesEveryDescendantOnce) {
-    CountingNode::destroyed = 0;
-    {
-        PTNSubTree root("root");
-        auto* leaf = new CountingNode("b", 2);
-        auto* inner = With(new PTNSubTree("inner"), {leaf});
-        With(&root, {new CountingNode("a", 1), inner, nullptr});
-        EXPECT_EQ(root.GetChildren()->GetCount(), 2);
-        EXPECT_EQ(inner->GetParentRef(), &root);
-        EXPECT_EQ(leaf->GetParentRef(), inner);
+// A merge as the plain recursive walk does it.
+void ReferenceMerge(PTNSubTree& tree, PTNSubTree& other, const ExceptionList& exceptions) {
+    for (DWXParseTreeNode* child : Children(tree)) {
+        if (exceptions.IsMember(child->GetName())) {
+            continue;
+        }
+        DWXParseTreeNode* source = WalkFind(other, child->GetName(), nullptr);
+        auto* subtree = dynamic_cast<PTNSubTree*>(child);
+        auto* sourceSubtree = dynamic_cast<PTNSubTree*>(source);
+        if (subtree && sourceSubtree) {
+            ReferenceMerge(*subtree, *sourceSubtree, exceptions);
+        } else if (!subtree && source) {
+            child->SetFrom(source);
+        }
     }
-    EXPECT_EQ(CountingNode::destroyed, 2);
 }
 
-TEST(SubTreeTest, LookupsTakeTheFirstNamesake) {
+// Random appends, renames, deletions by hand, moves between two trees,
+// refused adoptions of an ancestor, copies, merges and assignments (also
+// from itself and from its own child), on trees
+// below and far above the index threshold: after every step both trees
+// answer as a walk does, and every merge does what the recursive walk does.
+TEST(SubTreeTest, LookupsAndMergesAgreeWithAWalkThroughEveryChange) {
+    ExceptionList lists[3];  // none, a few, and more than a walk of the list suits
+    for (const char* name : {"WIDTH", "one", "two"}) {  // the roots are never compared
+        lists[1].Add(name);
+    }
+    for (const char* name : {"A", "B", "LONG_NAME_X", "f1", "f2", "f3", "f4", "f5", "f6", "f7"}) {
+        lists[2].Add(name);
+    }
+    for (int size : {4, 12, 300}) {
+        std::mt19937 random(static_cast<unsigned>(size));
+        PTNSubTree one("one"), two("two");
+        for (int i = 0; i < size; ++i) {
+            one.AddChild(NewNode(random, i));
+            two.AddChild(NewNode(random, -i));
+        }
+        for (int step = 0; step < 400; ++step) {
+            PTNSubTree& tree = random() % 2 ? one : two;
+            PTNSubTree& other = &tree == &one ? two : one;
+            std::vector<DWXParseTreeNode*> children = Children(tree);
+            DWXParseTreeNode* some =
+                children.empty() ? nullptr : children[random() % children.size()];
+            auto* subtree = dynamic_cast<PTNSubTree*>(some);
+            switch (random() % 7) {
+                case 0:
+                    tree.AddChild(NewNode(random, step));
+                    break;
+                case 1:
+                case 2:
+                    if (some) {
+                        some->SetName(random() % 9 ? NewName(random).c_str() : nullptr);
+                    }
+                    break;
+                case 3:
+                    delete some;
+                    break;
+                case 4:
+                    other.AddChild(some);  // moved, not shared
+                    break;
+                case 5:
+                    if (step % 20 == 5) {  // merged into a copy, then assigned
+                        const ExceptionList& exceptions = lists[step % 3];
+                        std::unique_ptr<PTNSubTree> copy(tree.DeepCopy()),
+                            expected(tree.DeepCopy());
+                        ExpectLookupsAgree(*copy, "copy");
+                        copy->SetFrom(&other, exceptions);
+                        ReferenceMerge(*expected, other, exceptions);
+                        ASSERT_EQ(Text(*copy), Text(*expected));
+                        other = *copy;
+                    } else if (subtree && step > 390) {
+                        tree = *subtree;  // from its own child
+                    } else {
+                        tree = static_cast<const PTNSubTree&>(tree);
+                    }
+                    break;
+                default:
+                    if (subtree) {
+                        subtree->AddChild(&tree);  // refused: an ancestor
+                        subtree->AddChild(subtree);
+                    }
+                    tree.AddChild(some);  // its own child goes to the end
+                    break;
+            }
+            ExpectLookupsAgree(one, "one, step " + std::to_string(step), step % 20 == 0);
+            ExpectLookupsAgree(two, "two, step " + std::to_string(step), step % 20 == 0);
+        }
+    }
+}
+
+TEST(SubTreeTest, TypedReadersTakeTheFirstNamesakeOfTheirClass) {
     char* list[] = {const_cast<char*>("x"), nullptr};
-    auto* text = new PTNString("a", "first");
-    auto* number = new PTNInteger("a", 2);
     PTNSubTree tree("t");
-    With(&tree, {text, number, new PTNInteger(nullptr, 0),  // a nameless child is never found
-                 new PTNBool("flag", 5), new PTNInteger("WIDTH", 640), new PTNChar("c", 'q'),
-                 new PTNDouble("d", 2.5), new PTNString("nullString", nullptr),
-                 new PTNStringList("list", list),
-                 With(new PTNSubTree("inner"), {new PTNInteger("a", 3)})});
-
-    EXPECT_EQ(tree.GetChild("a"), text);
-    EXPECT_EQ(tree.GetChild("a", "PTNinteger"), number);
-    EXPECT_EQ(tree.GetChild("a", "Integer"), nullptr);  // a class name, not a keyword
-    EXPECT_EQ(tree.GetChild("wid"), nullptr);
-    EXPECT_EQ(tree.GetChild(nullptr), nullptr);
-    EXPECT_EQ(tree.GetNumberOfOccurence("A"), 2);  // grandchildren are not counted
-    EXPECT_EQ(tree.GetNumberOfOccurence(nullptr), 0);
-
-    EXPECT_EQ(tree.GetChildAsBool("flag"), 5);
-    EXPECT_EQ(tree.GetChildAsInteger("flag"), 5);
+    for (DWXParseTreeNode* node : std::initializer_list<DWXParseTreeNode*>{
+             new PTNString("a", "first"), new PTNInteger("a", 2), new PTNBool("flag", 5),
+             new PTNInteger("WIDTH", 640), new PTNChar("c", 'q'), new PTNDouble("d", 2.5),
+             new PTNStringList("list", list), new PTNInteger(nullptr, 1)}) {
+        tree.AddChild(node);
+    }
+    EXPECT_EQ(tree.GetChildAsBool("flag") + tree.GetChildAsInteger("flag"), 10);
     EXPECT_EQ(tree.GetChildAsBool("width"), 640);
     EXPECT_EQ(tree.GetChildAsChar("c"), 'q');
     EXPECT_EQ(tree.GetChildAsDouble("d"), 2.5);
-    EXPECT_STREQ(tree.GetChildAsString("a"), "first");
-    EXPECT_EQ(tree.GetChildAsString("nullString"), nullptr);
     EXPECT_STREQ(tree.GetChildAsStringList("list")[0], "x");
     // Absent, null, or a first namesake of another class: the defaults.
     for (const char* name : {"absent", static_cast<const char*>(nullptr), "a"}) {
         EXPECT_EQ(tree.GetChildAsChar(name) + tree.GetChildAsDouble(name), 0);
         EXPECT_EQ(tree.GetChildAsStringList(name), nullptr);
     }
-    for (const char* name : {"absent", static_cast<const char*>(nullptr)}) {
-        EXPECT_EQ(tree.GetChildAsInteger(name) + tree.GetChildAsBool(name), 0);
-    }
-    EXPECT_EQ(tree.GetChildAsInteger("a"), 0);
-    for (const char* name : {"absent", static_cast<const char*>(nullptr), "d"}) {
-        EXPECT_STREQ(tree.GetChildAsString(name), "");
-    }
+    EXPECT_EQ(tree.GetChildAsBool("absent") + tree.GetChildAsBool(nullptr), 0);
+    EXPECT_EQ(tree.GetNumberOfOccurence(nullptr) + (tree.GetChild(nullptr) != nullptr), 0);
+    EXPECT_STREQ(tree.GetChildAsString("d"), "");
 }
 
-TEST(SubTreeTest, CopiesAreDeepAndSurviveTheSource) {
-    auto source = std::make_unique<PTNSubTree>("config");
-    With(source.get(), {new PTNInteger("width", 640),
-                        With(new PTNSubTree("colors"), {new PTNString("fg", "red")})});
-    const std::string text = Text(*source);
-    std::unique_ptr<PTNSubTree> deep(source->DeepCopy());
-    PTNSubTree constructed(*source);
-    PTNSubTree assigned("x");
-    assigned.AddChild(new PTNInteger("gone", 1));
-    assigned = *source;
-    source.reset();
-    for (PTNSubTree* copy : {deep.get(), &constructed, &assigned}) {
-        EXPECT_EQ(Text(*copy), text);
-        EXPECT_EQ(copy->GetParentRef(), nullptr);
-        auto* colors = static_cast<PTNSubTree*>(copy->GetChild("colors"));
-        EXPECT_EQ(colors->GetParentRef(), copy);
-        EXPECT_EQ(colors->GetChild("fg")->GetParentRef(), colors);
-    }
-    // Assigning a subtree from its own descendant, and from itself.
-    assigned = *static_cast<PTNSubTree*>(assigned.GetChild("colors"));
-    const PTNSubTree& alias = assigned;
-    assigned = alias;
-    EXPECT_EQ(Text(assigned), "(colors SubTree\n  (fg String \"red\")\n)\n");
-}
-
-TEST(ExceptionListTest, MembershipIgnoresCaseAndCopiesAreDeep) {
-    ExceptionList list;
-    list.Add("color");
+// Exception lists are copied deeply; a merge from nothing, or as a leaf
+// would, changes nothing.
+TEST(SubTreeTest, ExceptionListCopiesAndEmptyMerges) {
+    ExceptionList list, copied, other;
     list.Add(nullptr);
     for (int i = 0; i < 20; ++i) {
         list.Add(("name" + std::to_string(i)).c_str());
     }
-    ExceptionList copy(list);
-    ExceptionList assigned;
-    assigned.Add("old");
-    assigned = list;
+    other.Add("old");
+    copied = ExceptionList(list);
+    other = list;
     list = ExceptionList();
-    EXPECT_EQ(list.IsMember("color"), 0);
-    for (const ExceptionList* l : {&copy, &assigned}) {
-        EXPECT_EQ(l->IsMember("COLOR") + l->IsMember("name19"), 2);
-        EXPECT_EQ(l->IsMember("colors") + l->IsMember("old") + l->IsMember(nullptr), 0);
-    }
+    EXPECT_EQ(list.IsMember("name1") + other.IsMember("old") + copied.IsMember("NAME190"), 0);
+    EXPECT_EQ(other.IsMember("NAME19") + copied.IsMember("name0"), 2);
+    PTNSubTree tree("t"), source("s");
+    tree.AddChild(new PTNInteger("x", 1));
+    source.AddChild(new PTNInteger("x", 2));
+    tree.SetFrom(nullptr, ExceptionList());
+    tree.SetFrom(static_cast<DWXParseTreeNode*>(&source));
+    EXPECT_EQ(tree.GetChildAsInteger("x"), 1);
 }
 
-// Both trees: a, color, inner { b, Color { c }, COLOR }, values base + 1..5.
-std::unique_ptr<PTNSubTree> MergeTree(int base) {
-    auto* color = With(new PTNSubTree("Color"), {new PTNInteger("c", base + 5)});
-    auto* inner = With(new PTNSubTree("inner"),
-                       {new PTNInteger("b", base + 3), color, new PTNInteger("COLOR", base + 4)});
-    return std::unique_ptr<PTNSubTree>(
-        With(new PTNSubTree(base == 0 ? "mine" : "theirs"),
-             {new PTNInteger("a", base + 1), new PTNInteger("color", base + 2), inner}));
-}
-
-std::string MergedValues(const char* exception, const char* exception2 = nullptr) {
-    auto mine = MergeTree(0);
-    ExceptionList exceptions;
-    exceptions.Add(exception);
-    exceptions.Add(exception2);
-    mine->SetFrom(MergeTree(100).get(), exceptions);
-    std::string text = Text(*mine);
-    std::string values;
-    for (size_t at = text.find("Integer "); at != std::string::npos;
-         at = text.find("Integer ", at + 1)) {
-        values += text.substr(at + 8, text.find(')', at) - at - 8) + " ";
-    }
-    return values;
-}
-
-TEST(MergeTest, ExceptionsFirstMatchesAndClasses) {
-    // COLOR keeps 4: its first namesake in the other tree is a subtree.
-    EXPECT_EQ(MergedValues(nullptr), "101 102 103 105 4 ");
-    EXPECT_EQ(MergedValues("color"), "101 2 103 5 4 ");          // at every depth, whole subtrees
-    EXPECT_EQ(MergedValues("inner", "mine"), "101 102 3 5 4 ");  // roots never compared
-
-    PTNSubTree mine("m"), theirs("t");
-    With(&mine, {new PTNInteger("x", 0), new PTNInteger("X", 0), new PTNInteger("y", 0),
-                 new PTNInteger(nullptr, 0), new PTNSubTree("s")});
-    With(&theirs, {new PTNInteger("x", 1), new PTNInteger("x", 2), new PTNString("y", "7"),
-                   new PTNInteger("y", 7), new PTNInteger(nullptr, 8), new PTNInteger("s", 9),
-                   new PTNInteger("z", 9)});
-    mine.SetFrom(&theirs, ExceptionList());
-    mine.SetFrom(nullptr, ExceptionList());
-    mine.SetFrom(static_cast<DWXParseTreeNode*>(&theirs));  // no effect on a subtree
-    EXPECT_EQ(Text(mine),
-              "(m SubTree\n  (x Integer 1)\n  (X Integer 1)\n  (y Integer 0)\n"
-              "  ( Integer 0)\n  (s SubTree\n  )\n)\n");
-}
-
-TEST(SubTreeTest, PathsAndRangeFor) {
+TEST(SubTreeTest, Paths) {
     PTNSubTree tree("root");
     tree.BuildFromString(
         "(viewer SubTree\n(window SubTree\n(width Integer 640)\n)\n(title String \"t\")\n"
@@ -186,24 +263,71 @@ TEST(SubTreeTest, PathsAndRangeFor) {
         found += (node ? Text(*node) : "null") + " ";
     }
     EXPECT_EQ(found, "640 640 800 800 3 \"t\" ");  // namesakes count whatever their class
-    EXPECT_EQ(tree.Find("viewer"), tree.GetChild("viewer"));
     // Not there, through a leaf, and malformed; brackets are always an index.
     for (const char* path :
          {"viewer/window[3]", "viewer/title/x", "viewer/nothere/width", "", "/viewer", "viewer/",
           "viewer//window", "viewer/window[]", "viewer/window[x]", "viewer/window[-1]",
           "viewer/window[1", "viewer/window[1]x", "viewer/window[99999999999]", "viewer/[0]",
-          "a[0]"}) {
-        EXPECT_EQ(tree.Find(path), nullptr) << path;
+          "a[0]", static_cast<const char*>(nullptr)}) {
+        EXPECT_EQ(tree.Find(path), nullptr) << (path ? path : "(null)");
     }
-    EXPECT_EQ(tree.Find(nullptr), nullptr);
-    EXPECT_EQ(tree.FindAs<PTNInteger>("viewer/window[1]/width")->GetValue(), 800);
     EXPECT_EQ(tree.FindAs<PTNString>("viewer/window/width"), nullptr);
-
-    std::string names;
-    for (DWXParseTreeNode* child : *tree.FindAs<PTNSubTree>("viewer")) {
-        names += child->GetName();
-    }
-    EXPECT_EQ(names, "windowtitlewindowWindow");
 }
+
+struct BigNode : PTNInteger {  // larger than the pool carves
+    BigNode() : PTNInteger("big", 7) { pad[sizeof pad - 1] = 1; }
+    char pad[4096];
+};
+
+// Made by a thread-local destructor that runs after the pool let go of the
+// thread's slab.
+struct LateMaker {
+    ~LateMaker() { delete new PTNInteger("late", 1); }
+};
+
+// Trees built on four threads, half of them deleted on the main thread.
+TEST(NodePoolTest, TreesOnSeparateThreadsAndDeletedOnAnother) {
+    std::vector<std::vector<PTNSubTree*>> handOver(4);
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 4; ++t) {
+        threads.emplace_back([t, &trees = handOver[static_cast<size_t>(t)]] {
+            thread_local LateMaker maker;
+            (void)&maker;
+            for (int round = 0; round < 20; ++round) {
+                auto* tree = new PTNSubTree("t");
+                for (int i = 0; i < 500; ++i) {
+                    tree->AddChild(new PTNInteger(std::to_string(i).c_str(), t + i));
+                }
+                tree->AddChild(new BigNode);
+                EXPECT_EQ(tree->GetChildAsInteger("499") + tree->GetChildAsInteger("big"), t + 506);
+                round % 2 ? trees.push_back(tree) : delete tree;
+            }
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    for (auto& trees : handOver) {
+        for (PTNSubTree* tree : trees) {
+            delete tree;
+        }
+    }
+}
+
+#if defined(__GLIBC__)
+// Reading and deleting a large tree again and again does not grow the heap.
+TEST(NodePoolTest, DeletedTreesGiveTheirMemoryBack) {
+    std::string text = "(root SubTree\n";
+    for (int i = 0; i < 20000; ++i) {
+        text += "  (n" + std::to_string(i) + " String \"value " + std::to_string(i) + "\")\n";
+    }
+    size_t before = 0;
+    for (int i = 0; i < 6; ++i) {
+        PTNSubTree(nullptr).BuildFromString(text.c_str());
+        before = i == 0 ? mallinfo2().uordblks : before;
+    }
+    EXPECT_LT(mallinfo2().uordblks, before + 256 * 1024);
+}
+#endif
 
 }  // namespace
