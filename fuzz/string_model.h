@@ -16,13 +16,14 @@
 #include <algorithm>
 #include <string>
 
-class StringModel {
-  public:
-    static const int kOperations = 18;
+struct StringModel {
+    static const int kOperations = 16;
     static const int kAppendChar = 3;
+    DWXString s;
+    std::string model;
 
-    void Apply(int operation, FuzzInput& input);
-    void Check(FuzzInput& input) const;
+    static int Sign(int value) { return (value > 0) - (value < 0); }
+    static int IndexOf(const char* base, const char* at) { return at ? int(at - base) : -1; }
 
     // Up to `steps` operations drawn from the input, each checked.
     void Run(FuzzInput& input, int steps) {
@@ -32,190 +33,125 @@ class StringModel {
         }
     }
 
-  private:
-    static int Sign(int value) { return (value > 0) - (value < 0); }
-    static int Lower(char c) { return c >= 'A' && c <= 'Z' ? c | 0x20 : static_cast<uint8_t>(c); }
-    static int IndexOf(const char* base, const char* found) {
-        return found ? static_cast<int>(found - base) : -1;
+    void Check(FuzzInput& input) const {
+        const int length = static_cast<int>(model.size());
+        const char* text = s;
+        FUZZ_CHECK(s.GetLength() == length && s.IsEmpty() == (length == 0));
+        FUZZ_CHECK(memcmp(text, model.data(), model.size()) == 0 && text[length] == '\0');
+        const int index = input.Range(-2, length + 2);
+        FUZZ_CHECK(s.GetAt(index) == (index >= 0 && index <= length ? text[index] : '\0'));
+        const std::string probe = input.Text(4);
+        const char* c = model.c_str();
+        const char ch = static_cast<char>(input.Byte());
+        FUZZ_CHECK(s.Compare(probe.c_str()) == Sign(strcmp(c, probe.c_str())));
+        FUZZ_CHECK(s.Find(probe.c_str()) == IndexOf(c, strstr(c, probe.c_str())));
+        FUZZ_CHECK(s.Find(ch) == IndexOf(c, strchr(c, ch)));
+        FUZZ_CHECK(s.ReverseFind(ch) == IndexOf(c, strrchr(c, ch)));
+        FUZZ_CHECK(s.ToInt() == atoi(c));
     }
-    static int CompareNoCase(const char* a, const char* b) {
-        for (;; ++a, ++b) {
-            if (Lower(*a) != Lower(*b) || *a == '\0') {
-                return Sign(Lower(*a) - Lower(*b));
-            }
-        }
-    }
 
-    DWXString s;
-    std::string model;
-};
-
-inline void StringModel::Check(FuzzInput& input) const {
-    const int length = static_cast<int>(model.size());
-    const char* text = s;
-    FUZZ_CHECK(s.GetLength() == length && s.IsEmpty() == (length == 0));
-    FUZZ_CHECK(memcmp(text, model.data(), model.size()) == 0 && text[length] == '\0');
-
-    const int index = input.Range(-2, length + 2);
-    FUZZ_CHECK(s.GetAt(index) == (index >= 0 && index <= length ? model.c_str()[index] : '\0'));
-    const std::string probe = input.Text(4);
-    const char* c = model.c_str();
-    FUZZ_CHECK(s.Compare(probe.c_str()) == Sign(strcmp(c, probe.c_str())));
-    FUZZ_CHECK(Sign(s.CompareNoCase(probe.c_str())) == CompareNoCase(c, probe.c_str()));
-    FUZZ_CHECK(s.Find(probe.c_str()) == IndexOf(c, strstr(c, probe.c_str())));
-    const char ch = static_cast<char>(input.Byte());
-    FUZZ_CHECK(s.Find(ch) == IndexOf(c, strchr(c, ch)));
-    FUZZ_CHECK(s.ReverseFind(ch) == IndexOf(c, strrchr(c, ch)));
-    FUZZ_CHECK(s.ToInt() == atoi(c));
-}
-
-inline void StringModel::Apply(int operation, FuzzInput& input) {
-    const int length = static_cast<int>(model.size());
-    // Operations that double the string are skipped past 4096 bytes, so that a
-    // run stays fast; growth itself is covered long before that.
-    const bool big = length > 4096;
-    const std::string text = operation <= 6 ? input.Text(40) : "";
-    const char ch = static_cast<char>(input.Byte());
-    const int count = input.Range(-3, length + 3);
-    switch (operation) {
-        case 0:
-            s = text.c_str();
-            model = text.c_str();
-            break;
-        case 1: {
-            const int n = std::min(count, static_cast<int>(text.size()));
-            s = DWXString(text.data(), n);
-            model = text.substr(0, static_cast<size_t>(std::max(n, 0)));
-            break;
-        }
-        case 2:
-            s += text.c_str();
-            model += text.c_str();
-            break;
-        case kAppendChar:
-            s += ch;
-            model += ch;
-            break;
-        case 4:
-            s += DWXString(text.data(), static_cast<int>(text.size()));
-            model += text;
-            break;
-        case 5:
-            if (!big) {
-                s += s;
-                model += model;
-            }
-            break;
-        case 6: {
-            const DWXString other(text.data(), static_cast<int>(text.size()));
-            switch (count & 3) {
-                case 0:
-                    s = s + other + ch;
-                    model = model + text + ch;
-                    break;
-                case 1:
-                    s = ch + s + text.c_str();
-                    model = ch + model + text.c_str();
-                    break;
-                default:
-                    s = text.c_str() + s;
-                    model = text.c_str() + model;
-            }
-            break;
-        }
-        case 7:
-            s = s.Left(count);
-            model = model.substr(0, static_cast<size_t>(count < 0 ? 0 : count));
-            break;
-        case 8:
-            s = s.Right(count);
-            model =
-                count <= 0 ? "" : model.substr(static_cast<size_t>(std::max(length - count, 0)));
-            break;
-        case 9: {
-            const int start = input.Range(-3, length + 3);
-            s = s.Mid(start, count);
-            if (start > length || count < -1) {
-                model.clear();
-            } else {
-                model = model.substr(static_cast<size_t>(std::max(start, 0)),
-                                     count == -1 ? std::string::npos : static_cast<size_t>(count));
-            }
-            break;
-        }
-        case 10:
-            if (count >= 0 && count < length && input.Flag()) {
-                s[count] = ch;
-            } else {
-                s.SetAt(count, ch);
-            }
-            if (count == length) {
+    void Apply(int operation, FuzzInput& input) {
+        const int length = static_cast<int>(model.size());
+        const std::string text = operation <= 6 ? input.Text(40) : "";
+        const char* const ctext = text.c_str();
+        const char ch = static_cast<char>(input.Byte());
+        const int count = input.Range(-3, length + 3);
+        const int start = std::clamp(count, 0, length);
+        // Doubling is skipped past 4096 bytes, so that a run stays fast.
+        const bool big = length > 4096;
+        switch (operation) {
+            case 0:
+                s = ctext;
+                model = ctext;
+                break;
+            case 1:
+                s = DWXString(text.data(), std::min(count, int(text.size())));
+                model = text.substr(0, size_t(std::max(count, 0)));
+                break;
+            case 2:
+                s += DWXString(text.data(), int(text.size()));
+                model += text;
+                break;
+            case kAppendChar:
+                s += ch;
                 model += ch;
-            } else if (count >= 0 && count < length) {
-                model[static_cast<size_t>(count)] = ch;
-            }
-            break;
-        case 11: {
-            const int newLength = count + input.Range(0, 40);
-            s.SetLength(newLength);
-            model.resize(static_cast<size_t>(std::max(newLength, 0)), ' ');
-            break;
-        }
-        case 12:
-            s.Empty();
-            model.clear();
-            break;
-        case 13:
-            ch & 1 ? s.MakeUpper() : s.MakeLower();
-            for (size_t i = 0; i < model.size() && model[i] != '\0'; ++i) {
-                const char c = model[i];
-                if (c >= (ch & 1 ? 'a' : 'A') && c <= (ch & 1 ? 'z' : 'Z')) {
-                    model[i] = static_cast<char>(c ^ 0x20);
+                break;
+            case 4:  // every form of +, and += of a C string
+                s = (ch + s) + ctext + (ctext + DWXString(text.data(), int(text.size()))) + ch;
+                s += ctext;
+                model = (ch + model) + ctext + (ctext + text) + ch + ctext;
+                break;
+            case 5:  // appending to itself: the source lies in the block replaced
+                if (!big) {
+                    s += s;
+                    model += model;
                 }
-            }
-            break;
-        case 14: {
-            // Arguments inside the string's own buffer; a %c of 0 ends the text.
-            if (big) {
+                break;
+            case 6: {  // copies, self-assignment, and text from the string's own buffer
+                s = DWXString(s);
+                s = static_cast<const DWXString&>(s);
+                const char* own = s;
+                const std::string tail(model.c_str() + start);
+                ch & 1 ? (s += own + start) : (s = own + start);
+                ch & 1 ? (model += tail) : (model = tail);
                 break;
             }
-            const int number = input.Int();
-            const char* own = s;
-            const int start = std::max(0, std::min(count, length));
-            s.Format("%s%c%d|%s", own + start, ch, number, own);
-            char digits[16];
-            snprintf(digits, sizeof digits, "%d", number);
-            const std::string self(model.c_str());
-            model = std::string(model.c_str() + start) + ch + digits + "|" + self;
-            model = model.c_str();
-            break;
-        }
-        case 15:
-            s = DWXString(ch, count % 301);
-            model.assign(static_cast<size_t>(std::max(count % 301, 0)), ch);
-            break;
-        case 16: {
-            // Copies, self-assignment, and text taken from the string's own buffer.
-            const DWXString copy(s);
-            DWXString assigned("x");
-            assigned = copy;
-            const DWXString& same = assigned;
-            assigned = same;
-            s = assigned;
-            const int start = std::max(0, std::min(count, length));
-            const std::string tail(model.c_str() + start);
-            if (ch & 1) {
-                s += static_cast<const char*>(s) + start;
-                model += tail;
-            } else {
-                s = static_cast<const char*>(s) + start;
-                model = tail;
+            case 7:
+                s = s.Left(count);
+                model = model.substr(0, size_t(std::max(count, 0)));
+                break;
+            case 8:
+                s = s.Right(count);
+                model = count <= 0 ? "" : model.substr(size_t(std::max(length - count, 0)));
+                break;
+            case 9: {
+                const int from = input.Range(-3, length + 3);
+                s = s.Mid(from, count);
+                model = from > length || count < -1
+                            ? ""
+                            : model.substr(size_t(std::max(from, 0)),
+                                           count == -1 ? std::string::npos : size_t(count));
+                break;
             }
-            break;
+            case 10:
+                count >= 0 && count < length&& ch & 1 ? void(s[count] = ch) : s.SetAt(count, ch);
+                if (count == length) {
+                    model += ch;
+                } else if (count >= 0 && count < length) {
+                    model[size_t(count)] = ch;
+                }
+                break;
+            case 11:
+                s.SetLength(count + (ch & 31));
+                model.resize(size_t(std::max(count + (ch & 31), 0)), ' ');
+                break;
+            case 12:
+                ch & 1 ? s.MakeUpper() : s.MakeLower();
+                for (size_t i = 0; i < model.size() && model[i] != '\0'; ++i) {
+                    if (model[i] >= (ch & 1 ? 'a' : 'A') && model[i] <= (ch & 1 ? 'z' : 'Z')) {
+                        model[i] ^= 0x20;
+                    }
+                }
+                break;
+            case 13: {  // arguments in the string's own buffer; a %c of 0 ends the text
+                const int number = input.Int();
+                const char* own = s;
+                s.Format("%s%c%d|%s", own + start, ch, number, big ? "" : own);
+                char tail[16];
+                snprintf(tail, sizeof tail, "%d|", number);
+                model =
+                    (std::string(model.c_str() + start) + ch + tail + (big ? "" : model.c_str()));
+                model = model.c_str();
+                break;
+            }
+            case 14:
+                s = DWXString(ch, count % 301);
+                model.assign(size_t(std::max(count % 301, 0)), ch);
+                break;
+            default:
+                ch & 1 ? s.Empty() : void(s = ch);
+                model = ch & 1 ? std::string() : std::string(1, ch);
+                break;
         }
-        default:
-            s = ch;
-            model.assign(1, ch);
-            break;
     }
-}
+};

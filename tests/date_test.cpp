@@ -5,6 +5,8 @@
 
 #include <gtest/gtest.h>
 
+#include <string.h>
+
 #include <random>
 #include <string>
 #include <vector>
@@ -13,18 +15,14 @@ namespace {
 
 using Texts = std::vector<std::string>;
 
-// The texts of the reports so far, each checked for the date's code and severity.
 Texts Take(ReportCapture& capture) {
-    Texts texts;
-    for (const CapturedReport& report : capture.Take()) {
-        texts.push_back(report.code == 100 && report.severity == 0 ? report.message
-                                                                   : "unexpected code or severity");
-    }
+    const Texts texts = capture.Texts();
+    capture.Clear();
     return texts;
 }
 
 std::string Invalid(const char* field, int m, int d, int y) {
-    return std::string("Invalid ") + field +
+    return std::string("100/0 Invalid ") + field +
            " for DWXDate Object (month, day, year):  " + std::to_string(m) + " " +
            std::to_string(d) + " " + std::to_string(y) + ".\n";
 }
@@ -46,21 +44,21 @@ const char* IMPTime(const void*, int kind) {
 #endif
 
 // Every day from 1 January of year 1 to the end of year 3000, reached with ++,
-// is the next day number, and each is checked against the model, including
-// the jump back by one day, which rebuilds the date from its day number.
+// has the next day number and passes the model's checks, among them the jump
+// back by one day, which rebuilds the date from its day number.
 TEST(DateModel, EveryDayFromYear1To3000) {
-    date_model::CountingReports reports;
+    DateModel model;
     int64_t count = 0;
     for (DWXDate date; date.GetYear() <= 3000; ++date, ++count) {
-        ASSERT_EQ(count, date_model::Number(date)) << Fields(date);
-        date_model::CheckValid(date, DWXDate(), -1);
+        ASSERT_EQ(count, DateModel::Number(date)) << Fields(date);
+        DateModel::CheckValid(date, DWXDate(), -1);
     }
     EXPECT_EQ(1095727, count);  // 7.5 cycles of 400 years
-    EXPECT_EQ(0, date_model::Reports());
+    EXPECT_EQ(0, DateModel::Reports());
 }
 
-TEST(DateModel, SeededRuns) {
-    date_model::CountingReports reports;
+TEST(DateModel, SeededRunsAndTheEndsOfTheRange) {
+    DateModel model;
     std::mt19937 random(400);
     for (int run = 0; run < 2000; ++run) {
         std::vector<uint8_t> bytes(256);
@@ -68,52 +66,37 @@ TEST(DateModel, SeededRuns) {
             byte = static_cast<uint8_t>(random());
         }
         FuzzInput input(bytes.data(), bytes.size());
-        date_model::Run(input);
+        DateModel::Run(input);
     }
-}
-
-// The ends of the range: stepping and jumps stop there, differences saturate.
-TEST(DateModel, EndsOfTheRange) {
+    // Stepping and jumps stop at the ends, and differences saturate.
     const DWXDate first, last(12, 31, INT_MAX);
-    date_model::CheckValid(first, last, -1);
-    date_model::CheckValid(first, DWXDate(1, 1, 2), INT_MIN);
-    date_model::CheckValid(last, first, 1000);
-    date_model::CheckValid(DWXDate(1, 1, 2016), last, INT_MIN);
-    date_model::CheckValid(DWXDate(3, 1, 2000), first, INT_MAX);
+    DateModel::CheckValid(first, last, INT_MIN);
+    DateModel::CheckValid(last, first, 1000);
+    DateModel::CheckValid(DWXDate(1, 1, 2016), last, INT_MIN);
+    DateModel::CheckValid(DWXDate(3, 1, 2000), first, INT_MAX);
 }
 
-// Invalid values are reported with code 100 and severity 0, then stored.
+// Invalid values are reported with code 100 and severity 0, then stored; each
+// report names the fields stored at the time of its check.
 TEST(Date, ReportsNameTheDateAndStoreAnyway) {
-    struct Row {
-        int m, d, y;
-        Texts reports;
-    } rows[] = {
-        {2, 29, 2000, {}},
-        {2, 29, 1900, {Invalid("Day", 2, 29, 1900)}},
-        {13, 5, 2016, {Invalid("Month", 13, 5, 2016), Invalid("Day", 13, 5, 2016)}},
-        {0, 0, 0, {Invalid("Month", 0, 0, 0), Invalid("Year", 0, 0, 0), Invalid("Day", 0, 0, 0)}},
-    };
     ReportCapture capture;
-    for (const Row& row : rows) {
-        DWXDate date(row.m, row.d, row.y);
-        EXPECT_EQ(row.reports, Take(capture)) << row.m << " " << row.d << " " << row.y;
-    }
-
-    // Setters report with the fields stored at the time of each check.
-    DWXDate date(3, 5, 2016);
-    date.SetMonth(13);
-    EXPECT_EQ(Texts{Invalid("Month", 13, 5, 2016)}, Take(capture));
-    date.SetDate(13, 40, -1);
-    EXPECT_EQ((Texts{Invalid("Month", 13, 5, 2016), Invalid("Year", 13, 5, -1),
-                     Invalid("Day", 13, 40, -1)}),
+    DWXDate(2, 29, 1900);
+    DWXDate date(0, 0, 0);
+    EXPECT_EQ((Texts{Invalid("Day", 2, 29, 1900), Invalid("Month", 0, 0, 0),
+                     Invalid("Year", 0, 0, 0), Invalid("Day", 0, 0, 0)}),
               Take(capture));
+    date = DWXDate(3, 5, 2016);
+    date.SetMonth(13);
+    date.SetDate(13, 40, -1);
     EXPECT_EQ("13/40/-1", Fields(date));
     date = DWXDate(2, 10, 2016);
     date.SetDay(30);
     date.SetYear(0);
     date.SetDayOfYear(400);
     EXPECT_EQ(
-        (Texts{Invalid("Day", 2, 30, 2016), Invalid("Year", 2, 30, 0), Invalid("Day", 12, 65, 0)}),
+        (Texts{Invalid("Month", 13, 5, 2016), Invalid("Month", 13, 5, 2016),
+               Invalid("Year", 13, 5, -1), Invalid("Day", 13, 40, -1), Invalid("Day", 2, 30, 2016),
+               Invalid("Year", 2, 30, 0), Invalid("Day", 12, 65, 0)}),
         Take(capture));
 
     // The message format goes through translation before it is filled in.
@@ -122,7 +105,7 @@ TEST(Date, ReportsNameTheDateAndStoreAnyway) {
     });
     DWXDate(7, 4, -3);
     RTSetMessageCatalogue(previous);
-    EXPECT_EQ(Texts{"Jahr? 7/4/-3"}, Take(capture));
+    EXPECT_EQ(Texts{"100/0 Jahr? 7/4/-3"}, Take(capture));
 }
 
 #if !defined(_WIN32)
