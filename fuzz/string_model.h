@@ -17,8 +17,8 @@
 #include <string>
 
 struct StringModel {
-    static const int kOperations = 16;
-    static const int kAppendChar = 3;
+    static const int kOperations = 13;
+    static const int kAppendChar = 2;
     DWXString s;
     std::string model;
 
@@ -43,8 +43,9 @@ struct StringModel {
         const std::string probe = input.Text(4);
         const char* c = model.c_str();
         const char ch = static_cast<char>(input.Byte());
-        FUZZ_CHECK(s.Compare(probe.c_str()) == Sign(strcmp(c, probe.c_str())));
-        FUZZ_CHECK(s.Find(probe.c_str()) == IndexOf(c, strstr(c, probe.c_str())));
+        const char* const given = probe.empty() && ch & 1 ? nullptr : probe.c_str();
+        FUZZ_CHECK(s.Compare(given) == Sign(strcmp(c, probe.c_str())));
+        FUZZ_CHECK(s.Find(given) == IndexOf(c, strstr(c, probe.c_str())));
         FUZZ_CHECK(s.Find(ch) == IndexOf(c, strchr(c, ch)));
         FUZZ_CHECK(s.ReverseFind(ch) == IndexOf(c, strrchr(c, ch)));
         FUZZ_CHECK(s.ToInt() == atoi(c));
@@ -52,42 +53,39 @@ struct StringModel {
 
     void Apply(int operation, FuzzInput& input) {
         const int length = static_cast<int>(model.size());
-        const std::string text = operation <= 6 ? input.Text(40) : "";
+        const std::string text = operation <= 5 ? input.Text(40) : "";
         const char* const ctext = text.c_str();
         const char ch = static_cast<char>(input.Byte());
         const int count = input.Range(-3, length + 3);
+        const char* const given = text.empty() && count & 1 ? nullptr : ctext;  // null reads as ""
         const int start = std::clamp(count, 0, length);
         // Doubling is skipped past 4096 bytes, so that a run stays fast.
         const bool big = length > 4096;
         switch (operation) {
-            case 0:
-                s = ctext;
-                model = ctext;
+            case 0:  // = and += of text
+                ch & 1 ? (s = given) : (s += DWXString(text.data(), int(text.size())));
+                ch & 1 ? (model = ctext) : (model += text);
                 break;
             case 1:
                 s = DWXString(text.data(), std::min(count, int(text.size())));
                 model = text.substr(0, size_t(std::max(count, 0)));
                 break;
-            case 2:
-                s += DWXString(text.data(), int(text.size()));
-                model += text;
-                break;
             case kAppendChar:
                 s += ch;
                 model += ch;
                 break;
-            case 4:  // every form of +, and += of a C string
-                s = (ch + s) + ctext + (ctext + DWXString(text.data(), int(text.size()))) + ch;
-                s += ctext;
+            case 3:  // every form of +, and += of a C string
+                s = (ch + s) + given + (given + DWXString(text.data(), int(text.size()))) + ch;
+                s += given;
                 model = (ch + model) + ctext + (ctext + text) + ch + ctext;
                 break;
-            case 5:  // appending to itself: the source lies in the block replaced
+            case 4:  // appending to itself: the source lies in the block replaced
                 if (!big) {
                     s += s;
                     model += model;
                 }
                 break;
-            case 6: {  // copies, self-assignment, and text from the string's own buffer
+            case 5: {  // copies, self-assignment, and text from the string's own buffer
                 s = DWXString(s);
                 s = static_cast<const DWXString&>(s);
                 const char* own = s;
@@ -96,15 +94,13 @@ struct StringModel {
                 ch & 1 ? (model += tail) : (model = tail);
                 break;
             }
-            case 7:
-                s = s.Left(count);
-                model = model.substr(0, size_t(std::max(count, 0)));
+            case 6:
+                s = ch & 1 ? s.Left(count) : s.Right(count);
+                model = count <= 0 ? ""
+                        : ch & 1   ? model.substr(0, size_t(count))
+                                   : model.substr(size_t(std::max(length - count, 0)));
                 break;
-            case 8:
-                s = s.Right(count);
-                model = count <= 0 ? "" : model.substr(size_t(std::max(length - count, 0)));
-                break;
-            case 9: {
+            case 7: {
                 const int from = input.Range(-3, length + 3);
                 s = s.Mid(from, count);
                 model = from > length || count < -1
@@ -113,38 +109,30 @@ struct StringModel {
                                            count == -1 ? std::string::npos : size_t(count));
                 break;
             }
-            case 10:
-                count >= 0 && count < length&& ch & 1 ? void(s[count] = ch) : s.SetAt(count, ch);
-                if (count == length) {
-                    model += ch;
-                } else if (count >= 0 && count < length) {
+            case 8:  // SetAt, or a write through [] inside the text
+                if (count >= 0 && count < length) {
+                    ch & 1 ? void(s[count] = ch) : s.SetAt(count, ch);
                     model[size_t(count)] = ch;
+                } else {
+                    s.SetAt(count, ch);
+                    model += count == length ? std::string(1, ch) : "";
                 }
                 break;
-            case 11:
+            case 9:
                 s.SetLength(count + (ch & 31));
                 model.resize(size_t(std::max(count + (ch & 31), 0)), ' ');
                 break;
-            case 12:
-                ch & 1 ? s.MakeUpper() : s.MakeLower();
-                for (size_t i = 0; i < model.size() && model[i] != '\0'; ++i) {
-                    if (model[i] >= (ch & 1 ? 'a' : 'A') && model[i] <= (ch & 1 ? 'z' : 'Z')) {
-                        model[i] ^= 0x20;
-                    }
-                }
-                break;
-            case 13: {  // arguments in the string's own buffer; a %c of 0 ends the text
+            case 10: {  // arguments in the string's own buffer; a %c of 0 ends the text
                 const int number = input.Int();
                 const char* own = s;
                 s.Format("%s%c%d|%s", own + start, ch, number, big ? "" : own);
                 char tail[16];
                 snprintf(tail, sizeof tail, "%d|", number);
-                model =
-                    (std::string(model.c_str() + start) + ch + tail + (big ? "" : model.c_str()));
+                model = std::string(model.c_str() + start) + ch + tail + (big ? "" : model.c_str());
                 model = model.c_str();
                 break;
             }
-            case 14:
+            case 11:
                 s = DWXString(ch, count % 301);
                 model.assign(size_t(std::max(count % 301, 0)), ch);
                 break;
