@@ -16,6 +16,7 @@
 
 #include <algorithm>
 #include <string>
+#include <vector>
 
 struct DateModel {
     static bool Leap(int64_t year) { return year % 4 == 0 && (year % 100 != 0 || year % 400 == 0); }
@@ -41,20 +42,15 @@ struct DateModel {
         return DayNumber(d.GetMonth(), d.GetDay(), d.GetYear());
     }
     static int64_t Last() { return DayNumber(12, 31, INT_MAX); }
-    static int Saturate(int64_t n) {
-        return static_cast<int>(std::clamp<int64_t>(n, INT_MIN, INT_MAX));
-    }
+    static int Saturate(int64_t n) { return int(std::clamp<int64_t>(n, INT_MIN, INT_MAX)); }
 
-    // Reports counted while a DateModel exists (the fuzz target keeps one).
-    static int& Reports() {
-        static int count;
-        return count;
-    }
-    static void Count(int code, int severity, const char*) {
+    // The texts reported while a DateModel exists (the fuzz target keeps one).
+    static inline std::vector<std::string> reports;
+    static void Record(int code, int severity, const char* text) {
         FUZZ_CHECK(code == 100 && severity == 0);
-        ++Reports();
+        reports.push_back(text);
     }
-    IMPErrorHandler previous = IMPSetErrorHandler(&Count);
+    IMPErrorHandler previous = IMPSetErrorHandler(&Record);
     ~DateModel() { IMPSetErrorHandler(previous); }
 
     static void CheckText(const DWXDate& d) {
@@ -87,9 +83,9 @@ struct DateModel {
     }
 
     static DWXDate Made(int month, int day, int year) {
-        Reports() = 0;
+        reports.clear();
         const DWXDate d(month, day, year);
-        FUZZ_CHECK((Reports() == 0) == Valid(month, day, year));
+        FUZZ_CHECK(reports.empty() == Valid(month, day, year));
         FUZZ_CHECK(d.GetMonth() == month && d.GetDay() == day && d.GetYear() == year);
         return d;
     }
