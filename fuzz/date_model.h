@@ -51,6 +51,7 @@ struct DateModel {
         reports.push_back(text);
     }
     IMPErrorHandler previous = IMPSetErrorHandler(&Record);
+    DateModel() { reports.clear(); }
     ~DateModel() { IMPSetErrorHandler(previous); }
 
     static void CheckText(const DWXDate& d) {

@@ -6,6 +6,8 @@
 
 #include <string.h>
 
+#include <algorithm>
+#include <functional>
 #include <random>
 #include <string>
 #include <utility>
@@ -49,19 +51,13 @@ TEST(DateModel, EveryDayFromYear1To3000SeededRunsAndTheEnds) {
     }
     EXPECT_EQ(1095727, count);  // 7.5 cycles of 400 years
     std::mt19937 random(400);
-    for (int run = 0; run < 2000; ++run) {
-        std::vector<uint8_t> bytes(256);
-        for (uint8_t& byte : bytes) {
-            byte = static_cast<uint8_t>(random());
-        }
-        FuzzInput input(bytes.data(), bytes.size());
-        DateModel::Run(input);
-    }
+    std::vector<uint8_t> bytes(1 << 19);
+    std::generate(bytes.begin(), bytes.end(), std::ref(random));
+    FuzzInput input(bytes.data(), bytes.size());
+    DateModel::Run(input);
     const DWXDate first, last(12, 31, INT_MAX);
     DateModel::CheckValid(first, last, INT_MIN);
     DateModel::CheckValid(last, first, 1000);
-    DateModel::CheckValid(DWXDate(1, 1, 2016), last, INT_MIN);
-    DateModel::CheckValid(DWXDate(3, 1, 2000), first, INT_MAX);
 }
 
 // Invalid values are reported with code 100 and severity 0, then stored; each

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <random>
 #include <string>
 #include <utility>
@@ -24,9 +25,7 @@ TEST(DWXString, MatchesTheModelOverSeededRuns) {
     std::mt19937 random(19);
     for (int run = 0; run < 2000; ++run) {
         std::vector<uint8_t> bytes(4096);
-        for (uint8_t& byte : bytes) {
-            byte = random() % 4 ? static_cast<uint8_t>(random()) : 0;
-        }
+        std::generate(bytes.begin(), bytes.end(), [&] { return random() % 4 ? random() : 0; });
         FuzzInput input(bytes.data(), bytes.size());
         StringModel model;
         model.Run(input, 64);
