@@ -17,7 +17,7 @@
 #include <string>
 
 struct StringModel {
-    static const int kOperations = 13;
+    static const int kOperations = 12;
     static const int kAppendChar = 2;
     DWXString s;
     std::string model;
@@ -132,14 +132,13 @@ struct StringModel {
                 model = model.c_str();
                 break;
             }
-            case 11:
-                s = DWXString(ch, count % 301);
-                model.assign(size_t(std::max(count % 301, 0)), ch);
+            default: {  // a run of one character, a single one, or nothing
+                const int n = count % 301, form = input.Range(0, 2);
+                form == 0 ? void(s = DWXString(ch, n)) : form == 1 ? void(s = ch) : s.Empty();
+                model = form == 0 ? std::string(size_t(std::max(n, 0)), ch)
+                                  : std::string(size_t(form == 1), ch);
                 break;
-            default:
-                ch & 1 ? s.Empty() : void(s = ch);
-                model = ch & 1 ? std::string() : std::string(1, ch);
-                break;
+            }
         }
     }
 };
