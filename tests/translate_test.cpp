@@ -2,19 +2,8 @@
 
 #include <gtest/gtest.h>
 
-namespace {
-
-DWXTranslate Make(const double (&src)[4], const double (&dest)[4]) {
-    DWXTranslate map;
-    map.SetSrcRect(src[0], src[1], src[2], src[3]);
-    map.SetDestRect(dest[0], dest[1], dest[2], dest[3]);
-    return map;
-}
-
-}  // namespace
-
-// Corners map onto each other in order, whichever way round they are given,
-// and every point comes back where it started.
+// Corners map onto each other in order, whichever way round they are given
+// and whichever rectangle is set first, and every point comes back.
 TEST(Translate, MapsBothWaysIncludingFlippedAxes) {
     struct Row {
         double src[4], dest[4];
@@ -26,61 +15,45 @@ TEST(Translate, MapsBothWaysIncludingFlippedAxes) {
         {{2, 3, 4, 7}, {10, 20, 30, 60}, -2, -1, -30, -20},
     };
     for (const Row& row : rows) {
-        const DWXTranslate map = Make(row.src, row.dest);
-        EXPECT_DOUBLE_EQ(row.dx, map.Src2DestX(row.sx));
-        EXPECT_DOUBLE_EQ(row.dy, map.Src2DestY(row.sy));
+        DWXTranslate map, reversed;
+        map.SetSrcRect(row.src[0], row.src[1], row.src[2], row.src[3]);
+        map.SetDestRect(row.dest[0], row.dest[1], row.dest[2], row.dest[3]);
+        reversed.SetDestRect(row.dest[0], row.dest[1], row.dest[2], row.dest[3]);
+        reversed.SetSrcRect(row.src[0], row.src[1], row.src[2], row.src[3]);
         double x = row.sx, y = row.sy;
         map.Src2Dest(&x, &y);
-        EXPECT_DOUBLE_EQ(row.dx, x);
-        EXPECT_DOUBLE_EQ(row.dy, y);
+        EXPECT_TRUE(x == row.dx && y == row.dy && reversed.Src2DestX(row.sx) == x &&
+                    reversed.Src2DestY(row.sy) == y);
         map.Dest2Src(&x, &y);
-        EXPECT_DOUBLE_EQ(row.sx, x);
-        EXPECT_DOUBLE_EQ(row.sy, y);
-        EXPECT_DOUBLE_EQ(row.sx, map.Dest2SrcX(row.dx));
+        EXPECT_TRUE(x == row.sx && y == row.sy) << x << " " << y;
     }
-    // Setting the destination first gives the same map.
+}
+
+// A map never set gives 0 both ways; a flat source keeps the previous map but
+// stores its corners; a destination point squeezes every source point onto
+// it, and the way back gives 0. Null pointers are skipped.
+TEST(Translate, DegenerateMapsAndNullPointers) {
     DWXTranslate map;
-    map.SetDestRect(0, 0, 100, 50);
+    EXPECT_EQ(0.0, map.Src2DestX(7) + map.Src2DestY(7) + map.Dest2SrcX(7) + map.Dest2SrcY(7));
     map.SetSrcRect(0, 0, 10, 10);
-    EXPECT_DOUBLE_EQ(25, map.Src2DestY(5));
-}
-
-TEST(Translate, ZeroAndDegenerateMaps) {
-    DWXTranslate fresh;
-    EXPECT_EQ(0.0,
-              fresh.Src2DestX(7) + fresh.Src2DestY(7) + fresh.Dest2SrcX(7) + fresh.Dest2SrcY(7));
-
-    // A flat source keeps the previous map on both axes but stores its corners.
-    const double flat[][4] = {{5, 0, 5, 10}, {0, 5, 20, 5}};
-    for (const auto& src : flat) {
-        DWXTranslate map = Make({0, 0, 10, 10}, {0, 0, 100, 50});
-        map.SetSrcRect(src[0], src[1], src[2], src[3]);
-        EXPECT_DOUBLE_EQ(50, map.Src2DestX(5));
-        EXPECT_DOUBLE_EQ(25, map.Src2DestY(5));
-        double x1, y1, x2, y2;
-        map.GetSrcRect(&x1, &y1, &x2, &y2);
-        EXPECT_TRUE(x1 == src[0] && y1 == src[1] && x2 == src[2] && y2 == src[3]);
-    }
-
-    // A destination point squeezes every source point onto it; the way back is 0.
-    const DWXTranslate point = Make({0, 0, 10, 10}, {3, 3, 3, 3});
-    double x = 8, y = -2;
-    point.Src2Dest(&x, &y);
-    EXPECT_TRUE(x == 3.0 && y == 3.0);
-    point.Dest2Src(&x, &y);
-    EXPECT_TRUE(x == 0.0 && y == 0.0);
-}
-
-TEST(Translate, NullPointersAreSkipped) {
-    const DWXTranslate map = Make({0, 0, 10, 10}, {0, 0, 100, 50});
-    double x = 5, y = 5;
+    map.SetDestRect(0, 0, 100, 50);
+    map.SetSrcRect(5, 0, 5, 10);
+    map.SetSrcRect(0, 5, 20, 5);
+    double x = 5, y = 5, x1 = -1, y1 = -1, x2 = -1, y2 = -1;
+    map.GetSrcRect(&x1, &y1, &x2, &y2);
     map.Src2Dest(&x, nullptr);
     map.Dest2Src(nullptr, &y);
-    EXPECT_TRUE(x == 50.0 && y == 1.0);  // y went back alone: 5 / 5
     map.Src2Dest(nullptr, nullptr);
     map.Dest2Src(nullptr, nullptr);
-    double y1 = -1, x2 = -1;
-    map.GetDestRect(nullptr, &y1, &x2, nullptr);
-    EXPECT_TRUE(y1 == 0.0 && x2 == 100.0);
     map.GetSrcRect(nullptr, nullptr, nullptr, nullptr);
+    EXPECT_TRUE(x1 == 0 && y1 == 5 && x2 == 20 && y2 == 5 && map.Src2DestY(5) == 25);
+    EXPECT_TRUE(x == 50.0 && y == 1.0);  // y went back alone: 5 / 5
+
+    map.SetSrcRect(0, 0, 10, 10);
+    map.SetDestRect(3, 3, 3, 3);
+    map.Src2Dest(&x, &y);
+    EXPECT_TRUE(x == 3.0 && y == 3.0);
+    map.Dest2Src(&x, &y);
+    map.GetDestRect(nullptr, &y1, &x2, nullptr);
+    EXPECT_TRUE(x == 0.0 && y == 0.0 && y1 == 3.0 && x2 == 3.0);
 }
