@@ -169,17 +169,35 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
 }
 
 // Only regular files and the null device (under any name) pass; a FIFO
-// without a writer is refused at once, never waited on.
-TEST(UtilhubFiles, OnlyReadableRegularFilesAndTheNullDevicePassTheCheck) {
+// without a writer is refused at once, never waited on. Streams that DKOpen
+// opened remember their path.
+TEST(UtilhubFiles, CheckingOpeningAndReading) {
     ScratchDir dir;
-    std::string file = dir.Write("plain.cfg", "x\n");
+    std::string file = dir.Write("read.cfg", "first\r\n\nlast");
     std::string fifo = dir.Path("pipe"), nullLink = dir.Path("off.cfg");
     ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
     ASSERT_EQ(symlink("/dev/null", nullLink.c_str()), 0);
     for (const std::string& path : {file, std::string("/dev/null"), nullLink}) {
         EXPECT_EQ(DKCheck(path.c_str()), 1) << path;
-        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), path == file ? "x/" : "") << path;
+        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), path == file ? "first//last/" : "");
     }
+    FILE* stream = DKOpen(file.c_str(), 4, "r");
+    ASSERT_NE(stream, nullptr);
+    const char* name = fp2filename(stream);
+    EXPECT_EQ(name, file);
+    EXPECT_EQ(fp2filename(stream), name);
+    for (const char* line : {"first", "", "last"}) {
+        EXPECT_STREQ(DKReadLine(stream), line);
+    }
+    EXPECT_EQ(DKReadLine(stream), nullptr);
+    EXPECT_EQ(DKClose(stream) + DKClose(nullptr), 0);
+    // Streams DKOpen did not open, possibly at the address of a closed one, have no path.
+    FILE* foreign = fopen(file.c_str(), "r");
+    EXPECT_EQ(fp2filename(foreign), nullptr);
+    EXPECT_EQ(fp2filename(nullptr), nullptr);
+    fclose(foreign);
+
+    EXPECT_EQ(DKOpen(dir.Path("missing").c_str(), 4, "r"), nullptr);
     chmod(file.c_str(), 0);  // unreadable, unless we are root
     for (const std::string& path :
          {dir.Root(), std::string("/dev/zero"), fifo, dir.Path("missing"), std::string(), file}) {
@@ -192,27 +210,6 @@ TEST(UtilhubFiles, OnlyReadableRegularFilesAndTheNullDevicePassTheCheck) {
         EXPECT_EQ(reader.OpenFile(path.c_str()) + !!reader.Next(nullptr), 0) << path;
     }
     EXPECT_EQ(DKCheck(nullptr) + !!TextFileToStringList(nullptr), 0);
-}
-
-TEST(UtilhubFiles, StreamsRememberTheirPath) {
-    ScratchDir dir;
-    std::string path = dir.Write("read.cfg", "first\r\n\nlast");
-    EXPECT_EQ(DKOpen(dir.Path("missing").c_str(), 4, "r"), nullptr);
-    FILE* stream = DKOpen(path.c_str(), 4, "r");
-    ASSERT_NE(stream, nullptr);
-    const char* name = fp2filename(stream);
-    EXPECT_EQ(name, path);
-    EXPECT_EQ(fp2filename(stream), name);
-    for (const char* line : {"first", "", "last"}) {
-        EXPECT_STREQ(DKReadLine(stream), line);
-    }
-    EXPECT_EQ(DKReadLine(stream), nullptr);
-    EXPECT_EQ(DKClose(stream) + DKClose(nullptr), 0);
-    // Streams DKOpen did not open, possibly at the address of a closed one, have no path.
-    FILE* foreign = fopen(path.c_str(), "r");
-    EXPECT_EQ(fp2filename(foreign), nullptr);
-    EXPECT_EQ(fp2filename(nullptr), nullptr);
-    fclose(foreign);
 }
 
 TEST(UtilhubFiles, FindingAndExpandingPaths) {
@@ -249,6 +246,11 @@ TEST(UtilhubFiles, FindingAndExpandingPaths) {
     unsetenv(DWX_PRO_PATH_VARIABLE);
     EXPECT_EQ(IMPFindFile("pro", "both.cfg"), nullptr);
     EXPECT_EQ(IMPFindFile(nullptr, "both.cfg"), nullptr);
+    // A relative name is looked for next to the including file, an absolute one never.
+    char* next = IMPFindFileNextTo(second.Path("x.cfg").c_str(), "late.cfg");
+    EXPECT_EQ(next, second.Path("late.cfg"));
+    free(next);
+    EXPECT_EQ(IMPFindFileNextTo("/z/x.cfg", first.Path("both.cfg").c_str()), nullptr);
     EXPECT_EQ(HStringExpand(nullptr), nullptr);
     unsetenv(DWX_ETC_PATH_VARIABLE);
 }
