@@ -8,6 +8,7 @@
 
 #include <random>
 #include <string>
+#include <thread>
 #include <vector>
 
 namespace {
@@ -51,8 +52,12 @@ TEST(RtprimMkName, TextsStayValidForThirtyOneFurtherCallsAndGrow) {
     for (int i = 0; i < 32; ++i) {
         EXPECT_EQ(texts[i], "text " + std::to_string(i) + " " + std::string(i * 40, 'x'));
     }
-    std::string longText(100000, 'y');
-    EXPECT_EQ(MkName("%s!", longText.c_str()), longText + "!");
+    // Long texts grow the buffer instead of being cut; a fresh thread's ring
+    // has no room to spare, so the sanitizers see a buffer one byte short.
+    std::thread([] {
+        const std::string text(127, 'y');
+        EXPECT_EQ(MkName("%s!", text.c_str()), text + "!");
+    }).join();
 }
 
 TEST(RtprimMkName, DoublesReadBackExactly) {
