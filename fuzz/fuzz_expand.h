@@ -9,12 +9,7 @@
 #include <string>
 
 inline bool ExpandsOnReading(const std::string& value) {
-    if (!value.empty() && value[0] == '@') {
-        return true;
-    }
-    std::string::size_type first = FindFirstNonWhitespace(value, 0);
-    if (first == std::string::npos) {
-        return false;
-    }
-    return value.compare(first, 2, "_(") == 0 || value.compare(first, 13, "MkTokenString") == 0;
+    const std::string::size_type first = FindFirstNonWhitespace(value, 0);
+    const std::string rest = first == std::string::npos ? "" : value.substr(first);
+    return value[0] == '@' || rest.rfind("_(", 0) == 0 || rest.rfind("MkTokenString", 0) == 0;
 }

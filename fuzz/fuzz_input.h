@@ -8,6 +8,7 @@
 #include <stdio.h>
 #include <stdlib.h>
 
+#include <algorithm>
 #include <string>
 
 class FuzzInput {
@@ -15,15 +16,7 @@ class FuzzInput {
     FuzzInput(const uint8_t* data, size_t size) : pData(data), nSize(size) {}
 
     bool Empty() const { return nSize == 0; }
-
-    uint8_t Byte() {
-        if (nSize == 0) {
-            return 0;
-        }
-        --nSize;
-        return *pData++;
-    }
-
+    uint8_t Byte() { return nSize == 0 ? 0 : (--nSize, *pData++); }
     // A value in [low, high], from as few bytes as the range needs.
     int Range(int low, int high) {
         uint64_t span = static_cast<uint64_t>(static_cast<int64_t>(high) - low) + 1;
@@ -33,51 +26,33 @@ class FuzzInput {
         }
         return static_cast<int>(low + static_cast<int64_t>(value % span));
     }
-
     // Any int, from four bytes.
     int Int() {
-        uint32_t value = 0;
-        for (int i = 0; i < 4; ++i) {
-            value = (value << 8) | Byte();
-        }
-        return static_cast<int>(value);
+        const uint32_t high = static_cast<uint32_t>(Range(0, 0xFFFF));
+        return static_cast<int>(high << 16 | static_cast<uint32_t>(Range(0, 0xFFFF)));
     }
-
     bool Flag() { return Byte() & 1; }
-
     // A length byte, then that many bytes (fewer when the input runs out).
-    std::string Text(size_t maxLength = 255) {
-        size_t length = Byte() % (maxLength + 1);
-        if (length > nSize) {
-            length = nSize;
+    std::string Text(size_t maxLength = 255) { return Take(Byte() % (maxLength + 1)); }
+    // The text up to the next NUL byte (consumed) or the end of the input.
+    std::string CString() {
+        std::string text;
+        for (char c; nSize > 0 && (c = static_cast<char>(Byte())) != '\0';) {
+            text += c;
         }
+        return text;
+    }
+    std::string Rest() { return Take(nSize); }
+
+  private:
+    std::string Take(size_t length) {
+        length = std::min(length, nSize);
         std::string text(reinterpret_cast<const char*>(pData), length);
         pData += length;
         nSize -= length;
         return text;
     }
 
-    // The text up to the next NUL byte (consumed) or the end of the input.
-    std::string CString() {
-        std::string text;
-        while (nSize > 0) {
-            char c = static_cast<char>(Byte());
-            if (c == '\0') {
-                break;
-            }
-            text += c;
-        }
-        return text;
-    }
-
-    std::string Rest() {
-        std::string text(reinterpret_cast<const char*>(pData), nSize);
-        pData += nSize;
-        nSize = 0;
-        return text;
-    }
-
-  private:
     const uint8_t* pData;
     size_t nSize;
 };

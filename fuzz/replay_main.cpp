@@ -8,64 +8,47 @@
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
-#include <string>
 #include <vector>
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
 extern "C" int LLVMFuzzerInitialize(int* argc, char*** argv) __attribute__((weak));
 
-namespace {
-
-bool RunFile(const std::filesystem::path& path) {
-    std::ifstream stream(path, std::ios::binary);
-    if (!stream) {
-        fprintf(stderr, "cannot read %s\n", path.string().c_str());
-        return false;
-    }
-    std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(stream)),
-                               std::istreambuf_iterator<char>());
-    // A copy of exactly the input's size, so that reading past it is caught
-    // by the sanitizers as it is under libFuzzer.
-    static uint8_t none;
-    std::vector<uint8_t> exact(bytes);
-    LLVMFuzzerTestOneInput(exact.empty() ? &none : exact.data(), exact.size());
-    return true;
-}
-
-}  // namespace
-
 int main(int argc, char** argv) {
+    namespace fs = std::filesystem;
     // Absolute paths first: a target's initialisation may change directory.
-    std::vector<std::filesystem::path> arguments;
-    for (int i = 1; i < argc; ++i) {
-        arguments.push_back(std::filesystem::absolute(argv[i]));
+    std::vector<fs::path> arguments(argv + 1, argv + argc), files;
+    for (fs::path& path : arguments) {
+        path = fs::absolute(path);
     }
     if (LLVMFuzzerInitialize) {
         LLVMFuzzerInitialize(&argc, &argv);
     }
-    std::vector<std::filesystem::path> files;
-    for (const auto& path : arguments) {
-        if (std::filesystem::is_directory(path)) {
-            for (const auto& entry : std::filesystem::recursive_directory_iterator(path)) {
-                if (entry.is_regular_file()) {
-                    files.push_back(entry.path());
-                }
-            }
-        } else {
+    for (const fs::path& path : arguments) {
+        if (!fs::is_directory(path)) {
             files.push_back(path);
+            continue;
+        }
+        for (const auto& entry : fs::recursive_directory_iterator(path)) {
+            if (entry.is_regular_file()) {
+                files.push_back(entry.path());
+            }
         }
     }
     std::sort(files.begin(), files.end());
-    if (files.empty()) {
-        fprintf(stderr, "no inputs\n");
-        return 1;
-    }
-    for (const auto& file : files) {
-        if (!RunFile(file)) {
+    for (const fs::path& file : files) {
+        std::ifstream stream(file, std::ios::binary);
+        if (!stream) {
+            fprintf(stderr, "cannot read %s\n", file.c_str());
             return 1;
         }
+        // Exactly the input's size, so that reading past it is caught by the
+        // sanitizers as it is under libFuzzer.
+        std::vector<uint8_t> exact(fs::file_size(file));
+        stream.read(reinterpret_cast<char*>(exact.data()),
+                    static_cast<std::streamsize>(exact.size()));
+        static uint8_t none;
+        LLVMFuzzerTestOneInput(exact.empty() ? &none : exact.data(), exact.size());
     }
     printf("%zu inputs ran\n", files.size());
-    return 0;
+    return files.empty() ? 1 : 0;
 }

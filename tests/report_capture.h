@@ -15,28 +15,23 @@ struct CapturedReport {
     std::string message;  // "" for a null message
 };
 
-class ReportCapture {
+class ReportCapture {  // not copyable: it holds a mutex
   public:
-    ReportCapture() : oPrevious(IMPSetErrorHandler(&Record)) { Active() = this; }
+    ReportCapture() : oPrevious(IMPSetErrorHandler(&Record)) { pActive = this; }
     ~ReportCapture() {
         IMPSetErrorHandler(oPrevious);
-        Active() = nullptr;
+        pActive = nullptr;
     }
-    ReportCapture(const ReportCapture&) = delete;
-    ReportCapture& operator=(const ReportCapture&) = delete;
-
     // The handler this capture installed, and the one it replaced.
     static IMPErrorHandler Handler() { return &Record; }
     IMPErrorHandler Previous() const { return oPrevious; }
-
     // Read these once the threads that report are done.
     const std::vector<CapturedReport>& Reports() const { return oReports; }
-    // Each report as "code/severity message".
-    std::vector<std::string> Texts() const {
+    std::vector<std::string> Texts() const {  // each as "code/severity message"
         std::vector<std::string> texts;
-        for (const CapturedReport& report : oReports) {
-            texts.push_back(std::to_string(report.code) + "/" + std::to_string(report.severity) +
-                            " " + report.message);
+        for (const CapturedReport& r : oReports) {
+            texts.push_back(std::to_string(r.code) + "/" + std::to_string(r.severity) + " " +
+                            r.message);
         }
         return texts;
     }
@@ -47,18 +42,13 @@ class ReportCapture {
     void Clear() { Take(); }
 
   private:
-    static ReportCapture*& Active() {
-        static ReportCapture* active = nullptr;
-        return active;
-    }
     static void Record(int code, int severity, const char* message) {
-        ReportCapture* capture = Active();
-        if (capture != nullptr) {
+        if (ReportCapture* capture = pActive) {
             std::lock_guard<std::mutex> guard(capture->oLock);
-            capture->oReports.push_back({code, severity, message != nullptr ? message : ""});
+            capture->oReports.push_back({code, severity, message ? message : ""});
         }
     }
-
+    static inline ReportCapture* pActive = nullptr;
     IMPErrorHandler oPrevious;
     std::mutex oLock;
     std::vector<CapturedReport> oReports;

@@ -12,26 +12,20 @@
 
 class ScratchDir {
   public:
-    ScratchDir()
-        : oRoot((std::filesystem::temp_directory_path() / "dwxcore_test_XXXXXX").string()) {
+    ScratchDir() : oRoot((std::filesystem::temp_directory_path() / "dwxcore_XXXXXX").string()) {
         EXPECT_NE(mkdtemp(&oRoot[0]), nullptr);
     }
     ~ScratchDir() { std::filesystem::remove_all(oRoot); }
     ScratchDir(const ScratchDir&) = delete;
-    ScratchDir& operator=(const ScratchDir&) = delete;
 
     const std::string& Root() const { return oRoot; }
     std::string Path(const std::string& name) const { return oRoot + "/" + name; }
-
-    // Writes `text` to file `name` (directories on its path made first) and
-    // returns the file's path.
+    // Writes `text` to file `name` (directories on its path made first); returns its path.
     std::string Write(const std::string& name, const std::string& text) const {
-        const std::filesystem::path path = Path(name);
-        std::filesystem::create_directories(path.parent_path());
-        std::ofstream(path, std::ios::binary) << text;
-        return path.string();
+        std::filesystem::create_directories(std::filesystem::path(Path(name)).parent_path());
+        std::ofstream(Path(name), std::ios::binary) << text;
+        return Path(name);
     }
-
     // Empties the directory and keeps it.
     void Clear() const {
         std::filesystem::remove_all(oRoot);

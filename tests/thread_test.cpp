@@ -42,9 +42,7 @@ class Item : public DWXObject {
 std::string Round(int id, const std::string& file) {
     std::string failed;
     auto expect = [&failed](bool ok, const char* what) {
-        if (!ok && failed.size() < 1000) {
-            failed += std::string(what) + " ";
-        }
+        failed += ok || failed.size() > 1000 ? "" : std::string(what) + " ";
     };
     const std::string n = std::to_string(id);
 
@@ -73,8 +71,7 @@ std::string Round(int id, const std::string& file) {
     DWXPackedArray packed;
     DWXBag bag;
     DWXLinkedList list;
-    DWXContainer* containers[] = {&array, &packed, &bag, &list};
-    for (DWXContainer* container : containers) {
+    for (DWXContainer* container : std::vector<DWXContainer*>{&array, &packed, &bag, &list}) {
         for (int i = 1; i <= 10; ++i) {
             container->Add(new Item(i));
         }
@@ -100,9 +97,7 @@ std::string Round(int id, const std::string& file) {
 
     DWXString text = DWXFormat("thread %d", id) + DWXString("!");
     expect(std::string(static_cast<const char*>(text)) == "thread " + n + "!", "string");
-    DWXCmdLine line(("prog -id " + n).c_str());
-    expect(line.GetInt("-ID", -1, 0) == id, "command line");
-
+    expect(DWXCmdLine(("prog -id " + n).c_str()).GetInt("-ID", -1, 0) == id, "command line");
     DWXDate date(7, 4, 1776 + id);
     expect(std::string(date.GetString()) == "July 4, " + std::to_string(1776 + id), "date");
     DWXDate invalid(13, 1, 2000);  // reported
@@ -121,7 +116,7 @@ TEST(ThreadTest, SeparateObjectsOnSeparateThreads) {
     std::string common = dir.Write("common.cfg", "(common SubTree\n  (shared Integer 1)\n)\n");
     auto capture = std::make_unique<ReportCapture>();
     DWXDate(13, 1, 2000);  // the reports of one invalid date
-    const int reportsPerDate = static_cast<int>(capture->Take().size());
+    const size_t reportsPerDate = capture->Take().size();
     // Includes are traced, to a stream that every thread writes to.
     FILE* trace = tmpfile();
     FILE* previousTrace = tzn::tracer::Debugger::SetStream(trace);
@@ -159,13 +154,10 @@ TEST(ThreadTest, SeparateObjectsOnSeparateThreads) {
     fclose(trace);
     const size_t reports = capture->Reports().size();
     capture.reset();
-
     for (int id = 0; id < kThreads; ++id) {
-        EXPECT_EQ(failures[id], "") << "thread " << id;
-        EXPECT_EQ(singletons[id], singletons[0]) << "thread " << id;
+        EXPECT_EQ(failures[id] + (singletons[id] == singletons[0] ? "" : "singleton"), "") << id;
     }
-    EXPECT_EQ(reports,
-              static_cast<size_t>(kThreads * rounds * reportsPerDate));  // every report arrives
+    EXPECT_EQ(reports, kThreads * rounds * reportsPerDate);  // every report arrives
 }
 
 }  // namespace
