@@ -20,12 +20,13 @@ struct Option {
     std::vector<std::string> values;
 };
 
-// The non-empty pieces of `text` between separators.
-inline std::vector<std::string> Split(const std::string& text, char separator) {
+// The pieces of `text` between separators; empty ones only with `keepEmpty`.
+inline std::vector<std::string> Split(const std::string& text, char separator,
+                                      bool keepEmpty = false) {
     std::vector<std::string> pieces;
     std::istringstream stream(text);
     for (std::string piece; std::getline(stream, piece, separator);) {
-        if (!piece.empty()) {
+        if (keepEmpty || !piece.empty()) {
             pieces.push_back(piece);
         }
     }

@@ -22,12 +22,12 @@ TEST(DWXCmdLine, VectorsAndCommandsParseAsTheModel) {
             vector.push_back(arg.c_str());
             command += "  " + arg;
         }
-        const DWXCmdLine fromCommand(command.c_str());
         for (const char* probe : {"PROG", "-y", "x"}) {
             EXPECT_EQ(Mismatch(DWXCmdLine(int(vector.size()), vector.data()), Model(args), probe),
                       "");
-            EXPECT_EQ(Mismatch(fromCommand, Model(cmdline_model::Split(command, ' ')), probe), "")
-                << command;
+            EXPECT_EQ(Mismatch(DWXCmdLine(command.c_str()),
+                               Model(cmdline_model::Split(command, ' ')), probe),
+                      "");
         }
     }
 }
