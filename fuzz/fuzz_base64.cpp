@@ -1,12 +1,15 @@
 // The Base64 codec and leaf: decoding any text and encoding any bytes match
 // the plain codec of base64_model.h; the leaf keeps a text verbatim, decodes
-// it as the codec does, and writes it afresh when copied or set from another.
+// it (or a text it is given) as the codec does, and writes it afresh when
+// copied or set from another; copy construction and assignment are deep.
 #include <dwxcore/dwxparse.h>
 
 #include "base64_model.h"
 #include "fuzz_input.h"
 
 #include <stdlib.h>
+
+#include <memory>
 
 namespace {
 
@@ -15,6 +18,14 @@ std::string TextOf(const DWXParseTreeNode& node) {
     const std::string copy(text);
     free(text);
     return copy;
+}
+
+std::string Decoded(const PTNBase64& node, const char* text) {
+    unsigned length = 12345;
+    unsigned char* out = node.Decode(text, &length);
+    const std::string bytes(reinterpret_cast<char*>(out), length);
+    free(out);
+    return bytes;
 }
 
 }  // namespace
@@ -32,20 +43,20 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
 
     const std::string cText(text.c_str());
     const std::string decoded = base64_model::Decode(cText);
-    PTNBase64 node("data", raw, static_cast<unsigned>(bytes.size()));
-    node.SetAsString(cText.c_str());
-    FUZZ_CHECK(TextOf(node) == cText);
-    unsigned length = 12345;
-    unsigned char* out = node.Decode(nullptr, &length);
-    FUZZ_CHECK(std::string(reinterpret_cast<char*>(out), length) == decoded);
-    free(out);
+    auto node = std::make_unique<PTNBase64>("data", raw, static_cast<unsigned>(bytes.size()));
+    FUZZ_CHECK(Decoded(*node, nullptr) == bytes && Decoded(*node, cText.c_str()) == decoded);
+    node->SetAsString(cText.c_str());
+    FUZZ_CHECK(TextOf(*node) == cText && Decoded(*node, nullptr) == decoded);
 
-    DWXParseTreeNode* copy = node.Copy();
-    FUZZ_CHECK(TextOf(*copy) == base64_model::Encode(decoded));
+    std::unique_ptr<DWXParseTreeNode> copy(node->Copy());
     PTNBase64 target("target", raw, static_cast<unsigned>(bytes.size()));
-    target.SetFrom(&node);
+    target.SetFrom(node.get());
     target.SetFrom(&target);
+    PTNBase64 copied(*node), assigned("assigned", nullptr, 0);
+    assigned = *node;
+    node.reset();
+    FUZZ_CHECK(TextOf(*copy) == base64_model::Encode(decoded));
     FUZZ_CHECK(TextOf(target) == base64_model::Encode(decoded));
-    delete copy;
+    FUZZ_CHECK(TextOf(copied) == cText && TextOf(assigned) == cText);
     return 0;
 }
