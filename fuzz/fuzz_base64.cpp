@@ -3,29 +3,23 @@
 // it (or a text it is given) as the codec does, and writes it afresh when
 // copied or set from another; copy construction and assignment are deep.
 #include <dwxcore/dwxparse.h>
+#include <services/rtprim.h>
 
 #include "base64_model.h"
 #include "fuzz_input.h"
-
-#include <stdlib.h>
 
 #include <memory>
 
 namespace {
 
 std::string TextOf(const DWXParseTreeNode& node) {
-    char* text = node.GetAsString();
-    const std::string copy(text);
-    free(text);
-    return copy;
+    return HeapText(node.GetAsString()).get();
 }
 
 std::string Decoded(const PTNBase64& node, const char* text) {
     unsigned length = 12345;
-    unsigned char* out = node.Decode(text, &length);
-    const std::string bytes(reinterpret_cast<char*>(out), length);
-    free(out);
-    return bytes;
+    HeapPtr<unsigned char> bytes(node.Decode(text, &length));
+    return std::string(reinterpret_cast<char*>(bytes.get()), length);
 }
 
 }  // namespace

@@ -37,20 +37,12 @@ class Noted : public DWXObject {
     std::string oName;
 };
 
-class Registry : public ::testing::Test {
-  protected:
-    void SetUp() override {
-        ExitProcessing::Run();
-        gDeleted.clear();
-    }
-    void TearDown() override { ExitProcessing::Run(); }
-};
-
 }  // namespace
 
 // Replaced objects are deleted at once, released ones belong to the caller,
 // and one object under two names is deleted once.
-TEST_F(Registry, OwnsWhatItHoldsAndDeletesItOnce) {
+TEST(Registry, OwnsWhatItHoldsAndDeletesItOnce) {
+    ExitProcessing::Run();  // a registry of this test's own
     DWXCurrentFinder* registry = GetDWXCurrentFinder();
     EXPECT_EQ(registry, DWXCurrentFinder::GetInstance());
     Noted* first = new Noted("first");
