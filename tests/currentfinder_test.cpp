@@ -63,6 +63,7 @@ TEST(Registry, OwnsWhatItHoldsAndDeletesItOnce) {
     registry->SetCurrent("b", shared);
     registry->SetCurrent("c", shared);
     registry->SetCurrent("b", new Noted("b"));
+    registry->SetCurrent("f", shared);  // still under two names at the exit
     registry->SetCurrent("d", kept);
     registry->SetCurrent("e", kept);
     EXPECT_EQ(kept, registry->ReleaseCurrent("d"));  // leaves the table under every name
