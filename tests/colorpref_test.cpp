@@ -1,38 +1,15 @@
-#include <dwxcore/dwxcolorpref.h>
+// Colour preferences through a host's store (shared with the colour fuzz
+// target), and the parse tree's preference model, whose file must give back
+// what it stored.
+#include "container_test_util.h"
+
+#include "../fuzz/pref_models.h"
 
 #include <gtest/gtest.h>
 
-#include <map>
 #include <memory>
-#include <string>
-#include <vector>
 
 namespace {
-
-// A host's store with case-sensitive keys and a record of every lookup. With
-// bOneBuffer it hands every text out of one buffer that the next lookup overwrites.
-class MapModel : public PreferenceModel {
-  public:
-    bool StorePreference(const char* key, char* text) override {
-        if (bAccept)
-            oTexts[key] = text;
-        return bAccept;
-    }
-    const char* LookupPreference(const char* key) override {
-        oLookups.push_back(key != nullptr ? key : "(null)");
-        auto found = key != nullptr ? oTexts.find(key) : oTexts.end();
-        if (found == oTexts.end())
-            return nullptr;
-        oBuffer = found->second;
-        return bOneBuffer ? oBuffer.c_str() : found->second.c_str();
-    }
-
-    std::map<std::string, std::string> oTexts;
-    std::vector<std::string> oLookups;
-    std::string oBuffer;
-    bool bAccept = true;
-    bool bOneBuffer = false;
-};
 
 std::string Read(DWXColorPreferenceFormat& format, DWXColor* defaultColor, const char* key) {
     std::unique_ptr<DWXColor> c(format.GetPreference(defaultColor, key));
@@ -49,25 +26,24 @@ bool Store(DWXColorPreferenceFormat& format, const char* key, DWXColor* color) {
 
 TEST(ColorPreferenceTest, StoresRedGreenBlueAsCommaText) {
     MapModel model;
-    DWXColorPreferenceFormat format(&model);
-    DWXColor orange(0, 255, 128, 0), odd(300, -1, 7);
-    EXPECT_TRUE(Store(format, "Fill", &orange));
-    EXPECT_EQ(model.oTexts["Fill"], "255,128,0");
-    EXPECT_TRUE(Store(format, "Odd", &odd));
+    DWXColorPreferenceFormat format(&model), copy(format), assigned(nullptr);
+    assigned = copy;  // copies share the model
+    DWXColor odd(0, 300, -1, 7);
+    EXPECT_TRUE(Store(assigned, "Odd", &odd));
     EXPECT_EQ(model.oTexts["Odd"], "44,255,7");
-
     model.bAccept = false;  // the model's answer is passed on
-    EXPECT_FALSE(Store(format, "Other", &orange));
+    EXPECT_FALSE(Store(format, "Other", &odd));
     model.bAccept = true;
     EXPECT_FALSE(Store(format, "Other", nullptr));
     EXPECT_FALSE(format.SetPreference("Other", nullptr));
     EXPECT_EQ(model.oTexts.count("Other"), 0u);
 
-    DWXColorPreferenceFormat copy(format), assigned(nullptr);
-    assigned = copy;  // copies share the model
-    DWXColor stored(7, 200, 55, 100);
-    ASSERT_TRUE(Store(copy, "Fill", &stored));
-    EXPECT_EQ(Read(assigned, nullptr, "Fill"), "255 200 55 100");
+    // Without a model the default is copied and nothing stored.
+    DWXColorPreferenceFormat none(nullptr);
+    std::unique_ptr<DWXColor> color(none.GetPreference(&odd, "Odd"));
+    ASSERT_TRUE(color && color.get() != &odd && *color == odd);
+    EXPECT_EQ(Read(none, nullptr, "Odd"), "null");
+    EXPECT_FALSE(Store(none, "Odd", &odd));
 }
 
 TEST(ColorPreferenceTest, ReadsTheKeyThenComponentKeysThenTheDefault) {
@@ -82,31 +58,22 @@ TEST(ColorPreferenceTest, ReadsTheKeyThenComponentKeysThenTheDefault) {
         {"HalfBlueColor", "3"},   {"ColorRedColor", "1"},   {"ColorGreenColor", "2"},
         {"ColorBlueColor", "3"},
     };
-    const struct {
-        const char* key;
-        const char* expected;  // alpha red green blue; "default" for the fallback
-    } cases[] = {
-        {"Line", "255 10 20 30"},
-        {"Wide", "255 44 0 255"},
-        {"Words", "255 0 0 0"},
-        {"Color", "255 1 2 44"},
-        {"BackColor", "255 4 5 6"},
-        {"ShortColor", "default"},  // malformed text never leads to the component keys
-        {"LongColor", "default"},
-        {"HalfColor", "default"},   // one component missing
-        {"ColorColor", "default"},  // first "Color" is not the end
-        {"Back", "default"},
-        {"color", "default"},
-        {"", "default"},
-        {nullptr, "default"},
-    };
     DWXColorPreferenceFormat format(&model);
+    const char* found[][2] = {{"Line", "255 10 20 30"},
+                              {"Wide", "255 44 0 255"},
+                              {"Words", "255 0 0 0"},
+                              {"Color", "255 1 2 44"},
+                              {"BackColor", "255 4 5 6"}};
+    for (const auto& c : found) {
+        EXPECT_EQ(Read(format, nullptr, c[0]), c[1]) << c[0];
+    }
+    // Malformed text never leads to the component keys; HalfColor lacks one;
+    // in ColorColor the first "Color" is not the end.
     DWXColor fallback(0, 9, 9, 9);
-    for (const auto& c : cases) {
-        const bool isDefault = std::string(c.expected) == "default";
-        EXPECT_EQ(Read(format, &fallback, c.key), isDefault ? "0 9 9 9" : c.expected)
-            << (c.key ? c.key : "null");
-        EXPECT_EQ(Read(format, nullptr, c.key) == "null", isDefault);
+    for (const char* key : std::initializer_list<const char*>{
+             "ShortColor", "LongColor", "HalfColor", "ColorColor", "Back", "color", "", nullptr}) {
+        EXPECT_EQ(Read(format, &fallback, key), "0 9 9 9") << (key ? key : "null");
+        EXPECT_EQ(Read(format, nullptr, key), "null");
     }
 
     // All three component keys are looked up before any is tested, and each text
@@ -121,11 +88,35 @@ TEST(ColorPreferenceTest, ReadsTheKeyThenComponentKeysThenTheDefault) {
     EXPECT_EQ(model.oLookups, lookups);
 }
 
-TEST(ColorPreferenceTest, WithoutAModelTheDefaultIsCopiedAndNothingStored) {
-    DWXColorPreferenceFormat format(nullptr);
-    DWXColor fallback(0, 1, 2, 3);
-    std::unique_ptr<DWXColor> color(format.GetPreference(&fallback, "Color"));
-    ASSERT_TRUE(color && color.get() != &fallback && *color == fallback);
-    EXPECT_EQ(format.GetPreference(nullptr, "Color"), nullptr);
-    EXPECT_FALSE(Store(format, "Color", &fallback));
+TEST(PreferenceModelTest, StoresStringChildrenThatComeBackFromTheFile) {
+    PTNSubTree tree("prefs");
+    tree.AddChild(new PTNInteger("Width", 640));
+    PTNPreferenceModel model(&tree), detached(nullptr);
+    DWXColorPreferenceFormat format(&model);
+    EXPECT_EQ(model.LookupPreference("Width"), nullptr);  // not a string child
+    char text[] = "first";
+    EXPECT_TRUE(model.StorePreference("Title", text));
+    text[0] = 'F';  // the model keeps its own copy
+    EXPECT_STREQ(model.LookupPreference("title"), "first");
+    std::string wide = "wide", second = "second";
+    EXPECT_TRUE(model.StorePreference("Width", &wide[0]));
+    EXPECT_TRUE(model.StorePreference("TITLE", &second[0]));  // in place
+    DWXColor fill(4, 5, 6);
+    EXPECT_TRUE(Store(format, "FillColor", &fill));
+    EXPECT_EQ(Captured([&](FILE* f) { tree.WriteToFile(f); }),
+              "(prefs SubTree\n  (Width Integer 640)\n  (Title String \"second\")\n"
+              "  (Width String \"wide\")\n  (FillColor String \"4,5,6\")\n)\n");
+    EXPECT_FALSE(model.StorePreference(nullptr, text) || model.StorePreference("Key", nullptr) ||
+                 detached.StorePreference("Key", text));
+    EXPECT_TRUE(!model.LookupPreference(nullptr) && !detached.LookupPreference("Key"));
+
+    // The fuzz corpus holds keys and texts the file would not give back; these
+    // it would, and the model must not refuse them.
+    for (const char* value :
+         {"", "two words", "q\"uote", "line\nfeed", "back\\slash", "x)", "@menu Cancel", "a,b|c"}) {
+        EXPECT_EQ(StoredAndReread("Text", value), value);
+    }
+    for (const char* key : {"", "ctl\x01"}) {
+        EXPECT_EQ(StoredAndReread(key, "1"), "(refused)");
+    }
 }

@@ -1,18 +1,13 @@
+// The registry of current objects: what it owns and deletes when, in which
+// order the exit deletes, and a fresh registry after that.
 #include <dwxcore/dwxcurrentfinder.h>
-#include <services/utilhub.h>
-
-#include "counting_object.h"
 
 #include <gtest/gtest.h>
 
-#include <dlfcn.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <string>
-#include <vector>
-
-DEFINE_COUNTING_OBJECT_COUNTERS();
 
 namespace {
 
@@ -21,158 +16,92 @@ struct ExitProcessing : DWXCurrentFinder {
     static void Run() { ExitCB(); }
 };
 
-std::vector<std::string> gDeleted;
+std::string gDeleted;
+int gPipe = -1;        // set in an exiting child: deletions are written there
+DWXObject* gReleased;  // reachable, so an exiting child does not leak it
 
-// Notes its name when deleted, so tests see the order of deletions.
-class NamedObject : public CountingObject {
+// Notes its name when deleted.
+class Noted : public DWXObject {
   public:
-    explicit NamedObject(const char* name) : oName(name) {}
-    ~NamedObject() override { gDeleted.push_back(oName); }
+    explicit Noted(const char* name) : oName(std::string(name) + " ") {}
+    ~Noted() override {
+        if (gPipe >= 0) {
+            (void)!write(gPipe, oName.data(), oName.size());
+        } else {
+            gDeleted += oName;
+        }
+    }
+    const char* GetClassName() const override { return "Noted"; }
 
   private:
     std::string oName;
 };
 
-// Writes one byte to a pipe when deleted, for deletions in an exiting child.
-class PipeObject : public DWXObject {
-  public:
-    explicit PipeObject(int fd) : nFd(fd) {}
-    ~PipeObject() override { (void)!write(nFd, "d", 1); }
-    const char* GetClassName() const override { return "PipeObject"; }
-
-  private:
-    int nFd;
-};
-
-struct Registration {
-    void (*callback)();
-    std::string source;
-    int line;
-};
-std::vector<Registration> gRegistrations;
-DWXObject* gReleased = nullptr;  // reachable, so an exiting child does not leak it
-
-class Registry : public ::testing::Test {
-  protected:
-    void SetUp() override {
-        ExitProcessing::Run();
-        CountingObject::Reset();
-        gDeleted.clear();
-    }
-    void TearDown() override { ExitProcessing::Run(); }
-};
-
-// Runs `child` in a forked process that then exits normally; the number of
-// PipeObjects deleted there, or -1 when it did not exit cleanly.
-int DeletionsInExitingChild(void (*child)(int fd)) {
-    int fds[2], count = 0, status = 0;
-    if (pipe(fds) != 0) {
-        return -1;
-    }
-    pid_t pid = fork();
-    if (pid == 0) {
-        close(fds[0]);
-        child(fds[1]);
-        exit(0);
-    }
-    close(fds[1]);
-    for (char byte; read(fds[0], &byte, 1) == 1;) {
-        ++count;
-    }
-    close(fds[0]);
-    waitpid(pid, &status, 0);
-    return (WIFEXITED(status) && WEXITSTATUS(status) == 0) ? count : -1;
-}
-
 }  // namespace
-
-// Notes each exit registration and passes it on to the service (found under
-// its C++ ABI name); the dynamic linker binds the library's call here.
-void _IMPAtExit(void (*callback)(), const char* sourceFile, int line) {
-    gRegistrations.push_back({callback, sourceFile ? sourceFile : "(null)", line});
-    using AtExit = void (*)(void (*)(), const char*, int);
-    static AtExit next = reinterpret_cast<AtExit>(dlsym(RTLD_NEXT, "_Z10_IMPAtExitPFvvEPKci"));
-    ASSERT_NE(nullptr, next);
-    next(callback, sourceFile, line);
-}
-
-TEST_F(Registry, OneInstanceWithItsExitHook) {
-    gRegistrations.clear();
-    DWXCurrentFinder* registry = GetDWXCurrentFinder();
-    ASSERT_NE(nullptr, registry);
-    EXPECT_EQ(registry, DWXCurrentFinder::GetInstance());
-    EXPECT_EQ(registry, GetDWXCurrentFinder());
-    ASSERT_EQ(1u, gRegistrations.size());
-    EXPECT_EQ("base/dwxcore/dwxcurrentfinder", gRegistrations[0].source);
-    EXPECT_EQ(10, gRegistrations[0].line);
-    registry->SetCurrent("doc", new CountingObject);
-    gRegistrations[0].callback();
-    EXPECT_EQ(1, CountingObject::destroyed);
-}
 
 // Replaced objects are deleted at once, released ones belong to the caller,
 // and one object under two names is deleted once.
-TEST_F(Registry, SetGetReleaseOwnership) {
+TEST(Registry, OwnsWhatItHoldsAndDeletesItOnce) {
+    ExitProcessing::Run();  // a registry of this test's own
     DWXCurrentFinder* registry = GetDWXCurrentFinder();
-    CountingObject* first = new CountingObject(1);
+    EXPECT_EQ(registry, DWXCurrentFinder::GetInstance());
+    Noted* first = new Noted("first");
     registry->SetCurrent("View", first);
     registry->SetCurrent("view", first);
     EXPECT_EQ(first, registry->GetCurrent("VIEW"));
     EXPECT_EQ(nullptr, registry->GetCurrent("Views"));
-    EXPECT_EQ(0, CountingObject::destroyed);
-    registry->SetCurrent("view", new CountingObject(2));
-    EXPECT_EQ(1, CountingObject::destroyed);
+    registry->SetCurrent("view", new Noted("second"));
     registry->SetCurrent("view", nullptr);
-    EXPECT_EQ(2, CountingObject::destroyed);
+    EXPECT_EQ(gDeleted, "first second ");
 
-    CountingObject* kept = new CountingObject(3);  // a null name is the empty name
+    Noted* kept = new Noted("kept");  // a null name is the empty name
     registry->SetCurrent(nullptr, kept);
     EXPECT_EQ(kept, registry->GetCurrent(""));
     EXPECT_EQ(kept, registry->ReleaseCurrent(""));
     EXPECT_EQ(nullptr, registry->ReleaseCurrent(""));
-    CountingObject* shared = new CountingObject(4);
-    registry->SetCurrent("a", shared);
+    Noted* shared = new Noted("shared");
     registry->SetCurrent("b", shared);
-    registry->SetCurrent("a", new CountingObject(5));
-    registry->SetCurrent("c", kept);
+    registry->SetCurrent("c", shared);
+    registry->SetCurrent("b", new Noted("b"));
+    registry->SetCurrent("f", shared);  // still under two names at the exit
     registry->SetCurrent("d", kept);
-    EXPECT_EQ(kept, registry->ReleaseCurrent("c"));  // leaves the table under every name
-    EXPECT_EQ(nullptr, registry->GetCurrent("d"));
-    EXPECT_EQ(2, CountingObject::destroyed);
+    registry->SetCurrent("e", kept);
+    EXPECT_EQ(kept, registry->ReleaseCurrent("d"));  // leaves the table under every name
+    EXPECT_EQ(nullptr, registry->GetCurrent("e"));
+    registry->SetCurrent("Alpha", new Noted("Alpha"));
+    registry->SetCurrent("empty", nullptr);
+    ExitProcessing::Run();  // in name order, ignoring case
     ExitProcessing::Run();
-    EXPECT_EQ(4, CountingObject::destroyed);
+    EXPECT_EQ(gDeleted, "first second Alpha b shared ");
+    EXPECT_EQ(nullptr, GetDWXCurrentFinder()->GetCurrent("alpha"));
     delete kept;
 }
 
-TEST_F(Registry, ExitDeletesInNameOrderAndStartsAfresh) {
-    DWXCurrentFinder* registry = GetDWXCurrentFinder();
-    for (const char* name : {"gamma", "Alpha", "beta"}) {
-        registry->SetCurrent(name, new NamedObject(name));
-    }
-    registry->SetCurrent("empty", nullptr);
-    ExitProcessing::Run();
-    ExitProcessing::Run();
-    EXPECT_EQ((std::vector<std::string>{"Alpha", "beta", "gamma"}), gDeleted);
-    EXPECT_EQ(0, CountingObject::Alive());
-    EXPECT_EQ(nullptr, GetDWXCurrentFinder()->GetCurrent("alpha"));
-    EXPECT_EQ(nullptr, GetDWXCurrentFinder()->GetCurrent("empty"));
-}
-
-// At a real process exit every recorded object goes exactly once, also with a
-// fresh registry made after an earlier exit run.
+// At a real process exit every recorded object goes exactly once, also in a
+// registry made after an earlier exit run; a released one stays.
 TEST(RegistryAtExit, ObjectsAreDeletedWhenTheProcessExits) {
-    EXPECT_EQ(2, DeletionsInExitingChild([](int fd) {
-                  GetDWXCurrentFinder()->SetCurrent("one", new PipeObject(fd));
-                  GetDWXCurrentFinder()->SetCurrent("two", new PipeObject(fd));
-                  GetDWXCurrentFinder()->SetCurrent("none", nullptr);
-              }));
-    EXPECT_EQ(2, DeletionsInExitingChild([](int fd) {
-                  GetDWXCurrentFinder()->SetCurrent("gone", new PipeObject(fd));
-                  ExitProcessing::Run();
-                  GetDWXCurrentFinder()->SetCurrent("late", new PipeObject(fd));
-              }));
-    EXPECT_EQ(0, DeletionsInExitingChild([](int fd) {
-                  GetDWXCurrentFinder()->SetCurrent("released", new PipeObject(fd));
-                  gReleased = GetDWXCurrentFinder()->ReleaseCurrent("released");
-              }));
+    int fds[2], status = 0;
+    ASSERT_EQ(pipe(fds), 0);
+    const pid_t pid = fork();
+    if (pid == 0) {
+        close(fds[0]);
+        gPipe = fds[1];
+        GetDWXCurrentFinder()->SetCurrent("gone", new Noted("gone"));
+        ExitProcessing::Run();
+        for (const char* name : {"two", "one", "released"}) {
+            GetDWXCurrentFinder()->SetCurrent(name, new Noted(name));
+        }
+        GetDWXCurrentFinder()->SetCurrent("none", nullptr);
+        gReleased = GetDWXCurrentFinder()->ReleaseCurrent("released");
+        exit(0);
+    }
+    close(fds[1]);
+    std::string deleted;
+    for (char byte; read(fds[0], &byte, 1) == 1;) {
+        deleted += byte;
+    }
+    close(fds[0]);
+    waitpid(pid, &status, 0);
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+    EXPECT_EQ(deleted, "gone one two ");
 }
