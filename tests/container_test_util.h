@@ -9,9 +9,6 @@
 
 #include <initializer_list>
 #include <string>
-#include <vector>
-
-using Members = std::vector<DWXObject*>;
 
 // What `write` writes to a stream, read back through open_memstream.
 template <typename Writer>
@@ -39,32 +36,13 @@ inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> me
     }
 }
 
-// The members a DWXIter walk yields, in order.
-inline Members Walk(const DWXContainer& container) {
-    Members members;
-    DWXIter iter;
-    for (DWXObject* member = iter.Start(&container); member; member = iter.Next()) {
-        members.push_back(member);
-    }
-    return members;
-}
-
-// Exposes the slot bookkeeping of an array class for assertions.
+// Exposes the buffer of an array class for assertions.
 template <typename Array>
 class SlotView : public Array {
   public:
     using Array::Array;
-    using Array::operator=;
     int Capacity() const { return this->nCapacity; }
-    int Top() const { return this->nTop; }
     bool HasBuffer() const { return this->ppoItems != nullptr; }
-    Members Slots() const {  // slot contents below the top, empty slots as null
-        Members slots;
-        for (int i = 0; i < Top(); ++i) {
-            slots.push_back((*this)[i]);
-        }
-        return slots;
-    }
 };
 
 class BagView : public DWXBag {
