@@ -10,6 +10,7 @@
 #include <stdlib.h>
 
 #include <algorithm>
+#include <string>
 #include <type_traits>
 #include <vector>
 
@@ -31,15 +32,15 @@ inline void (*gFail)(int line, const char* what) = [](int line, const char* what
 // members: gDeleted counts the deletions of each.
 inline constexpr int kPool = 12;
 inline int gDeleted[kPool];
+inline int gAsked;  // Validate calls
 
 class Item : public DWXObject, public DWXValidatable {
   public:
     explicit Item(int index) : nIndex(index) {}
     ~Item() override { ++gDeleted[nIndex]; }
     const char* GetClassName() const override { return "Item"; }
-    int Validate() const override { return ++nAsked, nIndex % 5 != 4; }
+    int Validate() const override { return ++gAsked, nIndex % 5 != 4; }
     const int nIndex;
-    mutable int nAsked = 0;
 };
 
 inline Item* gPool[kPool];
@@ -51,9 +52,6 @@ inline int CompareKeys(const void* a, const void* b) {
     const int x = Key(*static_cast<DWXObject* const*>(a));
     const int y = Key(*static_cast<DWXObject* const*>(b));
     return (x > y) - (x < y);
-}
-inline bool KeyLess(DWXObject* a, DWXObject* b) {
-    return Key(a) < Key(b);
 }
 
 // A pool member or null.
@@ -71,6 +69,20 @@ inline Members Walk(const DWXContainer& container) {
         members.push_back(o);
     }
     return members;
+}
+
+// What Dump writes, read back through open_memstream; a null stream is
+// not written to.
+inline std::string Dumped(const DWXObject& object) {
+    char* buffer = nullptr;
+    size_t length = 0;
+    FILE* stream = open_memstream(&buffer, &length);
+    object.Dump(stream);
+    object.Dump(nullptr);
+    fclose(stream);
+    const std::string text(buffer, length);
+    free(buffer);
+    return text;
 }
 
 inline Members WithoutNulls(Members items) {
@@ -104,8 +116,10 @@ void ArrayStep(DWXArray& array, Members& slots, Source& in, DWXObject* o, int op
         slots = WithoutNulls(slots);
         const Members sorted = Walk(array);
         MODEL_CHECK(std::is_permutation(sorted.begin(), sorted.end(), slots.begin(), slots.end()));
-        MODEL_CHECK(compare ? std::is_sorted(sorted.begin(), sorted.end(), KeyLess)
-                            : sorted == slots);
+        MODEL_CHECK(compare
+                        ? std::is_sorted(sorted.begin(), sorted.end(),
+                                         [](DWXObject* x, DWXObject* y) { return Key(x) < Key(y); })
+                        : sorted == slots);
         slots = sorted;
     } else {
         // Checked only here: GetMaxIndex trims the top, which would hide an
@@ -219,20 +233,27 @@ void RunContainer(Source& in, int steps) {
             kArray ? WithoutNulls(items)
                    : Members(items.begin(), std::find(items.begin(), items.end(), nullptr));
         MODEL_CHECK(Walk(c) == walk);
+        // A dump shows an array's slots, a bag's walk and a list's nodes.
+        std::string dump = kArray  ? ""
+                           : kList ? "nCount=" + std::to_string(items.size()) + "\n"
+                                   : "DWXBag:\n";
+        const Members& dumped = kArray || kList ? items : walk;
+        for (size_t i = 0; i < dumped.size(); ++i) {
+            char line[64];
+            snprintf(line, sizeof line, "Item:%p\n", static_cast<const void*>(dumped[i]));
+            const std::string slot =
+                kArray ? c.GetClassName() + ("[" + std::to_string(i) + "]:") : "";
+            dump += !dumped[i] ? (kList ? "NULL\n" : "") : slot + line + (kList ? "\n" : "");
+        }
+        MODEL_CHECK(Dumped(c) == dump);
         MODEL_CHECK(Members(c.begin(), c.end()) == walk);  // the walk of range-for
         MODEL_CHECK(c.GetCount() == static_cast<int>(kArray ? walk.size() : items.size()));
         // Validate asks the members in walk order until one fails.
         auto invalid =
             std::find_if(walk.begin(), walk.end(), [](DWXObject* m) { return Key(m) == 4; });
-        int asked = 0;
-        for (Item* item : gPool) {
-            item->nAsked = 0;
-        }
+        gAsked = 0;
         MODEL_CHECK(c.Validate() == (invalid == walk.end() ? 1 : 0));
-        for (Item* item : gPool) {
-            asked += item->nAsked;
-        }
-        MODEL_CHECK(asked == (invalid - walk.begin()) + (invalid == walk.end() ? 0 : 1));
+        MODEL_CHECK(gAsked == (invalid - walk.begin()) + (invalid == walk.end() ? 0 : 1));
         for (int i = 0; i <= kPool; ++i) {
             DWXObject* m = i < kPool ? gPool[i] : nullptr;
             const Members& held = kArray ? walk : items;
@@ -276,16 +297,10 @@ void RunContainer(Source& in, int steps) {
 // One run on a container the source picks.
 template <typename Source>
 void Run(Source& in, int steps) {
-    switch (in.Range(0, 3)) {
-        case 0:
-            return RunContainer<DWXArray>(in, steps);
-        case 1:
-            return RunContainer<DWXPackedArray>(in, steps);
-        case 2:
-            return RunContainer<DWXBag>(in, steps);
-        default:
-            return RunContainer<DWXLinkedList>(in, steps);
-    }
+    void (*const runs[])(Source&, int) = {
+        RunContainer<DWXArray, Source>, RunContainer<DWXPackedArray, Source>,
+        RunContainer<DWXBag, Source>, RunContainer<DWXLinkedList, Source>};
+    runs[in.Range(0, 3)](in, steps);
 }
 
 }  // namespace container_model

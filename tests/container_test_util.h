@@ -23,30 +23,17 @@ std::string Captured(Writer write) {
     return text;
 }
 
-// The line DWXObject::Dump writes for `object`.
-inline std::string ObjectLine(const DWXObject* object) {
-    char line[128];
-    snprintf(line, sizeof line, "%s:%p\n", object->GetClassName(), (const void*)object);
-    return line;
-}
-
 inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> members) {
     for (DWXObject* member : members) {
         container.Add(member);
     }
 }
 
-// Exposes the buffer of an array class for assertions.
-template <typename Array>
-class SlotView : public Array {
+// Exposes the buffer of an array or bag class for assertions.
+template <typename C>
+class View : public C {
   public:
-    using Array::Array;
+    using C::C;
     int Capacity() const { return this->nCapacity; }
     bool HasBuffer() const { return this->ppoItems != nullptr; }
-};
-
-class BagView : public DWXBag {
-  public:
-    using DWXBag::DWXBag;
-    int Capacity() const { return nCapacity; }
 };
