@@ -1,27 +1,14 @@
-// Helpers shared by the tests: dumps and written text captured the way a host
-// reads them, and views of the protected bookkeeping of the containers.
+// Helpers shared by the tests: written text captured the way a host reads it,
+// and views of the protected bookkeeping of the containers.
 #pragma once
+
+#include "../fuzz/container_model.h"
 
 #include <dwxcore/dwxobject.h>
 
-#include <stdio.h>
-#include <stdlib.h>
-
 #include <initializer_list>
-#include <string>
 
-// What `write` writes to a stream, read back through open_memstream.
-template <typename Writer>
-std::string Captured(Writer write) {
-    char* buffer = nullptr;
-    size_t length = 0;
-    FILE* stream = open_memstream(&buffer, &length);
-    write(stream);
-    fclose(stream);
-    std::string text(buffer, length);
-    free(buffer);
-    return text;
-}
+using container_model::Captured;  // what a writer callback writes to a stream
 
 inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> members) {
     for (DWXObject* member : members) {

@@ -7,8 +7,8 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <string>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 DEFINE_COUNTING_OBJECT_COUNTERS();
@@ -25,11 +25,7 @@ class HostContainer : public DWXContainer {
     void Add(DWXObject* o) override { members.push_back(o), ++nCount; }
     int Remove(const DWXObject* o) override {
         auto found = std::find(members.begin(), members.end(), o);
-        if (refuseRemove || found == members.end()) {
-            return 0;
-        }
-        members.erase(found), --nCount;
-        return 1;
+        return refuseRemove || found == members.end() ? 0 : (members.erase(found), --nCount, 1);
     }
     std::vector<DWXObject*> members;
     bool refuseRemove = false;
@@ -42,12 +38,12 @@ class HostContainer : public DWXContainer {
     }
 };
 
-TEST(ObjectTest, IteratorProtocol) {
-    for (DWXIter iter : {DWXIter(), DWXIter(nullptr)}) {
-        EXPECT_EQ(iter.Start(nullptr), nullptr);
-        EXPECT_EQ(iter.Next(), nullptr);
-        EXPECT_EQ(*iter, nullptr);
-    }
+// An unbound iterator yields nothing, and a position belongs to the container
+// that set it: retargeted, a walk starts on the new container.
+TEST(ObjectTest, Iterators) {
+    DWXIter unbound(nullptr);
+    EXPECT_EQ(unbound.Start(nullptr), nullptr);
+    EXPECT_EQ(unbound.Next(), nullptr);
     CountingObject a, b, c;
     DWXArray array;
     DWXBag bag;
@@ -56,15 +52,6 @@ TEST(ObjectTest, IteratorProtocol) {
     for (DWXContainer* container : all) {
         AddAll(*container, {&a, &b, &c});
     }
-    DWXIter iter(&array);
-    EXPECT_EQ(*iter, &a);  // a new iterator stands on the first member
-    DWXIter copy(iter);    // goes on from the same place, independently
-    EXPECT_EQ(copy.Next(), &b);
-    EXPECT_EQ(copy.Next(), &c);
-    EXPECT_EQ((++iter).Current(), &b);
-    EXPECT_EQ(iter.Start(nullptr), &a);  // restarts the bound container
-    // A position belongs to the container that set it: retargeted, a walk
-    // starts on the new container.
     for (DWXContainer* from : all) {
         for (DWXContainer* to : all) {
             DWXIter walk = from;
@@ -78,6 +65,26 @@ TEST(ObjectTest, IteratorProtocol) {
             EXPECT_EQ(walk.Next(), &a);
         }
     }
+}
+
+// A list walk holds its node: changes elsewhere in the list are safe.
+TEST(ObjectTest, ListWalksSurviveChangesAwayFromTheirNode) {
+    CountingObject a, b, c, d, e;
+    DWXLinkedList list;
+    AddAll(list, {&a, &b, &c});
+    DWXIter iter(&list);
+    list.Insert(&d, list.Find(&b));  // after the walk's node: visited
+    list.Prepend(&e);                // before it: not visited
+    list.Remove(&c);                 // another node
+    EXPECT_EQ(iter.Next(), &d);
+    EXPECT_EQ(iter.Next(), &b);
+    EXPECT_EQ(iter.Next(), nullptr);
+    list.Append(&c);
+    EXPECT_EQ(iter.Next(), nullptr);  // an ended walk stays ended
+    DWXIter unstarted;                // bound with SetTarget and never started: begins at the front
+    unstarted.SetTarget(&list);
+    EXPECT_EQ(unstarted.Next(), &e);
+    EXPECT_EQ(unstarted.Next(), &a);
 }
 
 // Hosts write `DWXIter iter = &array;` and pass containers where arrays are expected.
@@ -123,32 +130,29 @@ TEST(ObjectTest, DestroyContentsSurvivesDestructorsThatChangeTheContainer) {
     const std::vector<int> inOrder = {0, 1, 2, 3, 4, 5, 99};
     // Removing sibling 1 moves the last member, 5, into its slot, ahead of the walk.
     const std::vector<int> lastMoved = {0, 1, 5, 2, 3, 4, 99};
-    struct Case {
-        DWXContainer* container;
-        const std::vector<int>& log;
-    } cases[] = {{&array, inOrder},
-                 {&packed, lastMoved},
-                 {&bag, lastMoved},
-                 {&list, inOrder},
-                 {&host, inOrder}};
-    for (const Case& c : cases) {
+    const std::pair<DWXContainer*, std::vector<int>> cases[] = {{&array, inOrder},
+                                                                {&packed, lastMoved},
+                                                                {&bag, lastMoved},
+                                                                {&list, inOrder},
+                                                                {&host, inOrder}};
+    for (const auto& [container, log] : cases) {
         CountingObject::Reset();
         Meddler::log.clear();
         std::vector<Meddler*> m;
         for (int i = 0; i < 6; ++i) {
-            m.push_back(new Meddler(i, c.container));
-            c.container->Add(m.back());
+            m.push_back(new Meddler(i, container));
+            container->Add(m.back());
         }
-        c.container->Add(m[4]);  // held twice, and removes itself
+        container->Add(m[4]);    // held twice, and removes itself
         m[0]->poSibling = m[1];  // owner before its sibling
         m[3]->poSibling = m[2];  // owner after its sibling
         m[4]->bRemoveSelf = true;
         m[5]->bSpawn = true;
-        c.container->DestroyContents();
-        EXPECT_EQ(Meddler::log, c.log) << c.container->GetClassName();
+        container->DestroyContents();
+        EXPECT_EQ(Meddler::log, log) << container->GetClassName();
         EXPECT_EQ(CountingObject::constructed, 7);
-        EXPECT_EQ(CountingObject::Alive(), 0) << c.container->GetClassName();
-        EXPECT_EQ(c.container->GetCount(), 0);
+        EXPECT_EQ(CountingObject::Alive(), 0) << container->GetClassName();
+        EXPECT_EQ(container->GetCount(), 0);
     }
 }
 
