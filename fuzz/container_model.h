@@ -39,18 +39,16 @@ class Item : public DWXObject, public DWXValidatable {
     explicit Item(int index) : nIndex(index) {}
     ~Item() override { ++gDeleted[nIndex]; }
     const char* GetClassName() const override { return "Item"; }
-    int Validate() const override { return ++gAsked, nIndex % 5 != 4; }
+    int Validate() const override { return ++gAsked, Key(this) != 4; }
+    static int Key(const DWXObject* o) { return static_cast<const Item*>(o)->nIndex % 5; }
     const int nIndex;
 };
 
 inline Item* gPool[kPool];
 
-inline int Key(const DWXObject* o) {
-    return static_cast<const Item*>(o)->nIndex % 5;
-}
 inline int CompareKeys(const void* a, const void* b) {
-    const int x = Key(*static_cast<DWXObject* const*>(a));
-    const int y = Key(*static_cast<DWXObject* const*>(b));
+    const int x = Item::Key(*static_cast<DWXObject* const*>(a));
+    const int y = Item::Key(*static_cast<DWXObject* const*>(b));
     return (x > y) - (x < y);
 }
 
@@ -90,18 +88,21 @@ inline Members WithoutNulls(Members items) {
 }
 
 // The operations only arrays have, on `slots`: holes as null, none past the
-// highest member.
+// highest member. Returns the slot a store must hold (-1 for none): an
+// insert moves the slots up to `top`, the array's own.
 template <typename Source>
-void ArrayStep(DWXArray& array, Members& slots, Source& in, DWXObject* o, int op) {
+int ArrayStep(DWXArray& array, Members& slots, Source& in, DWXObject* o, int op, int top) {
     if (op == 6) {
         const bool insert = in.Flag();
         const int index = in.Range(-1, 40);
         insert ? array.InsertAt(index, o) : array.SetAt(index, o);
-        if (index >= 0) {
-            const size_t at = static_cast<size_t>(index);
-            slots.resize(std::max(slots.size(), insert ? at : at + 1));
-            insert ? (void)slots.insert(slots.begin() + index, o) : (void)(slots[at] = o);
+        if (index < 0) {
+            return -1;
         }
+        const size_t at = static_cast<size_t>(index);
+        slots.resize(std::max(slots.size(), insert ? at : at + 1));
+        insert ? (void)slots.insert(slots.begin() + index, o) : (void)(slots[at] = o);
+        return insert ? std::max(index, top) : index;
     } else if (op == 7) {
         const bool pack = in.Flag();
         pack ? array.Pack() : array.Reverse();
@@ -115,16 +116,18 @@ void ArrayStep(DWXArray& array, Members& slots, Source& in, DWXObject* o, int op
         slots = WithoutNulls(slots);
         const Members sorted = Walk(array);
         MODEL_CHECK(std::is_permutation(sorted.begin(), sorted.end(), slots.begin(), slots.end()));
-        MODEL_CHECK(compare
-                        ? std::is_sorted(sorted.begin(), sorted.end(),
-                                         [](DWXObject* x, DWXObject* y) { return Key(x) < Key(y); })
-                        : sorted == slots);
+        MODEL_CHECK(compare ? std::is_sorted(sorted.begin(), sorted.end(),
+                                             [](DWXObject* x, DWXObject* y) {
+                                                 return Item::Key(x) < Item::Key(y);
+                                             })
+                            : sorted == slots);
         slots = sorted;
     } else {
         // Checked only here: GetMaxIndex trims the top, which would hide an
         // Add that fails to reuse trailing empty slots.
         MODEL_CHECK(array.GetMaxIndex() == static_cast<int>(slots.size()));
     }
+    return -1;
 }
 
 // The operations only lists have.
@@ -152,6 +155,20 @@ void ListStep(DWXLinkedList& list, Members& items, Source& in, DWXObject* o, int
     }
 }
 
+// The buffer bookkeeping a host may read.
+template <typename C>
+struct Viewed : C {
+    int Capacity() const { return this->nCapacity; }
+    int Top() const { return this->nTop; }
+};
+
+// The capacity grown to hold slot `index`: twice the index, 64 for slot 0
+// (arrays), or about 1.3 times plus five (bags, when full).
+template <typename C>
+int Grown(int index) {
+    return std::is_same_v<C, DWXBag> ? static_cast<int>(index * 1.3 + 5.0) : index ? 2 * index : 64;
+}
+
 // A run of operations on a C, checked against `items`: the slots of an array,
 // or the members of a bag or list in order, stored nulls included. A walk
 // kept open across the steps of an array or bag is checked too: its position
@@ -164,17 +181,27 @@ void RunContainer(Source& in, int steps) {
     for (int i = 0; i < kPool; ++i) {
         gPool[i] = new Item(i);
     }
-    C c;
+    Viewed<C> c;
     Members items;
     DWXIter live(&c);
     size_t at = 0;
     for (int step = 0; step < steps && !in.Empty(); ++step) {
         DWXObject* o = Pick(in);
         const int op = in.Range(0, kArray || kList ? 9 : 5);
+        // The buffer bookkeeping before the step: where an Add goes, and a
+        // slot the step must hold.
+        int capacity = 0, top = static_cast<int>(items.size()), hold = -1;
+        if constexpr (kArray) {
+            top = c.Top();
+        }
+        if constexpr (!kList) {
+            capacity = c.Capacity();
+        }
         if (op < 2) {
             c.Add(o);  // an array ignores null and appends after its highest member
             if (o || !kArray) {
                 items.push_back(o);
+                hold = top;
             }
         } else if (op == 2) {
             // An array's null is never a member; the bag and the packed array
@@ -186,15 +213,20 @@ void RunContainer(Source& in, int steps) {
             } else if (found != items.end()) {
                 *found = kMovesLast ? items.back() : nullptr;
                 kMovesLast ? items.pop_back() : (void)0;
+                // The last member to leave an array frees its buffer.
+                capacity = kArray && WithoutNulls(items).empty() ? 0 : capacity;
             }
         } else if (op == 3) {
             // Copies are made from a walk (a list's node by node); a change to
             // a copy leaves the original alone.
             C copy(c);
-            C assigned;
+            Viewed<C> assigned;
             assigned.Add(gPool[0]);
-            assigned = c;
+            static_cast<C&>(assigned) = c;
             c = *&c;
+            if constexpr (!kList) {
+                MODEL_CHECK(assigned.Capacity() == c.GetCount());  // room for the members only
+            }
             const Members walk = Walk(c);
             MODEL_CHECK(Walk(copy) == walk && Walk(assigned) == walk);
             MODEL_CHECK(Walk(DWXBag(&c)) == walk && Walk(DWXArray(&c)) == walk);
@@ -220,13 +252,20 @@ void RunContainer(Source& in, int steps) {
                 gPool[i] = gDeleted[i] ? new Item(i) : gPool[i];
             }
             items.clear();
+            capacity = 0;
         } else if constexpr (kArray) {
-            ArrayStep(c, items, in, o, op);
+            hold = ArrayStep(c, items, in, o, op, top);
         } else if constexpr (kList) {
             ListStep(c, items, in, o, op);
         }
         while (kArray && !items.empty() && !items.back()) {
             items.pop_back();
+        }
+        // The buffer grows for a slot past it (AddContainer's adds are not
+        // followed).
+        if constexpr (!kList) {
+            capacity = hold >= capacity ? Grown<C>(hold) : capacity;
+            MODEL_CHECK(op == 4 || c.Capacity() == capacity);
         }
         const Members walk =
             kArray ? WithoutNulls(items)
@@ -249,7 +288,7 @@ void RunContainer(Source& in, int steps) {
         MODEL_CHECK(c.GetCount() == static_cast<int>(kArray ? walk.size() : items.size()));
         // Validate asks the members in walk order until one fails.
         auto invalid =
-            std::find_if(walk.begin(), walk.end(), [](DWXObject* m) { return Key(m) == 4; });
+            std::find_if(walk.begin(), walk.end(), [](DWXObject* m) { return Item::Key(m) == 4; });
         gAsked = 0;
         MODEL_CHECK(c.Validate() == (invalid == walk.end() ? 1 : 0));
         MODEL_CHECK(gAsked == (invalid - walk.begin()) + (invalid == walk.end() ? 0 : 1));
@@ -263,9 +302,9 @@ void RunContainer(Source& in, int steps) {
             }
         }
         if constexpr (kArray) {
-            const int top = static_cast<int>(items.size());
-            for (int i = -1; i <= top + 1; ++i) {
-                MODEL_CHECK(c[i] == (i >= 0 && i < top ? items[static_cast<size_t>(i)] : nullptr));
+            const int end = static_cast<int>(items.size());
+            for (int i = -1; i <= end + 1; ++i) {
+                MODEL_CHECK(c[i] == (i >= 0 && i < end ? items[static_cast<size_t>(i)] : nullptr));
             }
         }
         if (const int walkStep = in.Range(0, 3); !kList && walkStep < 2) {

@@ -1,6 +1,5 @@
 #include "../fuzz/container_model.h"
 #include "../fuzz/fuzz_input.h"
-#include "container_test_util.h"
 #include "counting_object.h"
 
 #include <gtest/gtest.h>
@@ -35,62 +34,6 @@ TEST(ContainerModelTest, RandomRunsAgreeWithTheModels) {
             FAIL() << "seed " << seed << ": " << failure.what();
         }
     }
-}
-
-// 64 slots first, then twice the index that does not fit; a copy holds room
-// for its members only, and the last member out frees the buffer.
-TEST(ArrayTest, Capacity) {
-    std::vector<CountingObject> objects(129);
-    View<DWXArray> array, set;
-    for (int i = 0; i < 128; ++i) {
-        array.Add(&objects[i]);
-        ASSERT_EQ(array.Capacity(), i < 64 ? 64 : 128) << "Add " << i + 1;
-    }
-    array.InsertAt(10, &objects[128]);  // a full buffer grows for an insert too
-    EXPECT_EQ(array.Capacity(), 256);
-    EXPECT_EQ(array[128], &objects[127]);
-    set.SetAt(10, &objects[0]);
-    EXPECT_EQ(set.Capacity(), 20);
-    set.SetAt(100, &objects[1]);
-    EXPECT_EQ(set.Capacity(), 200);
-    View<DWXArray> copy(set);
-    EXPECT_EQ(copy.Capacity(), 2);
-    copy.Add(&objects[2]);
-    EXPECT_EQ(copy.Capacity(), 4);
-    set.Remove(&objects[0]);
-    set.Remove(&objects[1]);
-    EXPECT_FALSE(set.HasBuffer() || View<DWXArray>(nullptr).HasBuffer());
-}
-
-// Capacities seen while adding, one entry per growth.
-std::vector<int> Growth(View<DWXBag>& bag, int adds) {
-    std::vector<int> capacities{bag.Capacity()};
-    for (int i = 0; i < adds; ++i) {
-        bag.Add(nullptr);
-        if (capacities.back() != bag.Capacity()) {
-            capacities.push_back(bag.Capacity());
-        }
-    }
-    return capacities;
-}
-
-// About 1.3 times plus five; a copy holds room for its members only,
-// removals keep the buffer and Empty frees it.
-TEST(BagTest, Capacity) {
-    CountingObject a, b, c;
-    View<DWXBag> bag, assigned;
-    EXPECT_EQ(Growth(bag, 344),
-              (std::vector<int>{0, 5, 11, 19, 29, 42, 59, 81, 110, 148, 197, 261, 344}));
-    DWXArray three;
-    AddAll(three, {&a, &b, &c});
-    View<DWXBag> built(&three);
-    AddAll(assigned, {&c, &c, &c, &c, &c, &c, &c});
-    assigned = built;
-    EXPECT_EQ(Growth(built, 16), (std::vector<int>{3, 8, 15, 24}));
-    EXPECT_EQ(assigned.Remove(&a) + assigned.Remove(&b) + assigned.Remove(&c), 3);
-    EXPECT_EQ(assigned.Capacity(), 3);
-    assigned.Empty();
-    EXPECT_FALSE(assigned.HasBuffer() || View<DWXBag>(nullptr).HasBuffer());
 }
 
 int ByValue(const void* a, const void* b) {

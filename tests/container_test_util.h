@@ -1,5 +1,5 @@
 // Helpers shared by the tests: written text captured the way a host reads it,
-// and views of the protected bookkeeping of the containers.
+// and containers filled in one call.
 #pragma once
 
 #include "../fuzz/container_model.h"
@@ -15,12 +15,3 @@ inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> me
         container.Add(member);
     }
 }
-
-// Exposes the buffer of an array or bag class for assertions.
-template <typename C>
-class View : public C {
-  public:
-    using C::C;
-    int Capacity() const { return this->nCapacity; }
-    bool HasBuffer() const { return this->ppoItems != nullptr; }
-};

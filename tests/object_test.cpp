@@ -81,7 +81,8 @@ TEST(ObjectTest, ListWalksSurviveChangesAwayFromTheirNode) {
     EXPECT_EQ(iter.Next(), nullptr);
     list.Append(&c);
     EXPECT_EQ(iter.Next(), nullptr);  // an ended walk stays ended
-    DWXIter unstarted;                // bound with SetTarget and never started: begins at the front
+    // Bound with SetTarget and never started, a walk begins at the front.
+    DWXIter unstarted;
     unstarted.SetTarget(&list);
     EXPECT_EQ(unstarted.Next(), &e);
     EXPECT_EQ(unstarted.Next(), &a);
@@ -115,8 +116,7 @@ class Meddler : public CountingObject {
     }
     DWXContainer* poIn;
     Meddler* poSibling = nullptr;
-    bool bRemoveSelf = false;
-    bool bSpawn = false;
+    bool bRemoveSelf = false, bSpawn = false;
     static std::vector<int> log;
 };
 std::vector<int> Meddler::log;
@@ -127,14 +127,10 @@ TEST(ObjectTest, DestroyContentsSurvivesDestructorsThatChangeTheContainer) {
     DWXBag bag;
     DWXLinkedList list;
     HostContainer host;
-    const std::vector<int> inOrder = {0, 1, 2, 3, 4, 5, 99};
     // Removing sibling 1 moves the last member, 5, into its slot, ahead of the walk.
-    const std::vector<int> lastMoved = {0, 1, 5, 2, 3, 4, 99};
-    const std::pair<DWXContainer*, std::vector<int>> cases[] = {{&array, inOrder},
-                                                                {&packed, lastMoved},
-                                                                {&bag, lastMoved},
-                                                                {&list, inOrder},
-                                                                {&host, inOrder}};
+    const std::vector<int> ordered = {0, 1, 2, 3, 4, 5, 99}, moved = {0, 1, 5, 2, 3, 4, 99};
+    const std::pair<DWXContainer*, std::vector<int>> cases[] = {
+        {&array, ordered}, {&packed, moved}, {&bag, moved}, {&list, ordered}, {&host, ordered}};
     for (const auto& [container, log] : cases) {
         CountingObject::Reset();
         Meddler::log.clear();
