@@ -1,7 +1,7 @@
 // Plain models of the four containers, checked after every step of a run of
 // random operations. Members come from a small pool and repeat. The fuzz
-// target draws a run from its input, the unit tests from a seeded generator:
-// any source with Empty(), Range(low, high) and Flag().
+// target draws a run from its input, a unit test from seeded random bytes
+// (any source with Empty(), Range(low, high) and Flag() would do).
 #pragma once
 
 #include <dwxcore/dwxobject.h>
@@ -116,10 +116,8 @@ int ArrayStep(DWXArray& array, Members& slots, Source& in, DWXObject* o, int op,
         slots = WithoutNulls(slots);
         const Members sorted = Walk(array);
         MODEL_CHECK(std::is_permutation(sorted.begin(), sorted.end(), slots.begin(), slots.end()));
-        MODEL_CHECK(compare ? std::is_sorted(sorted.begin(), sorted.end(),
-                                             [](DWXObject* x, DWXObject* y) {
-                                                 return Item::Key(x) < Item::Key(y);
-                                             })
+        auto keyLess = [](DWXObject* x, DWXObject* y) { return CompareKeys(&x, &y) < 0; };
+        MODEL_CHECK(compare ? std::is_sorted(sorted.begin(), sorted.end(), keyLess)
                             : sorted == slots);
         slots = sorted;
     } else {
