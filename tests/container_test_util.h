@@ -1,74 +1,17 @@
-// Helpers shared by the tests: dumps and written text captured the way a host
-// reads them, and views of the protected bookkeeping of the containers.
+// Helpers shared by the tests: written text captured the way a host reads it,
+// and containers filled in one call.
 #pragma once
+
+#include "../fuzz/container_model.h"
 
 #include <dwxcore/dwxobject.h>
 
-#include <stdio.h>
-#include <stdlib.h>
-
 #include <initializer_list>
-#include <string>
-#include <vector>
 
-using Members = std::vector<DWXObject*>;
-
-// What `write` writes to a stream, read back through open_memstream.
-template <typename Writer>
-std::string Captured(Writer write) {
-    char* buffer = nullptr;
-    size_t length = 0;
-    FILE* stream = open_memstream(&buffer, &length);
-    write(stream);
-    fclose(stream);
-    std::string text(buffer, length);
-    free(buffer);
-    return text;
-}
-
-// The line DWXObject::Dump writes for `object`.
-inline std::string ObjectLine(const DWXObject* object) {
-    char line[128];
-    snprintf(line, sizeof line, "%s:%p\n", object->GetClassName(), (const void*)object);
-    return line;
-}
+using container_model::Captured;  // what a writer callback writes to a stream
 
 inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> members) {
     for (DWXObject* member : members) {
         container.Add(member);
     }
 }
-
-// The members a DWXIter walk yields, in order.
-inline Members Walk(const DWXContainer& container) {
-    Members members;
-    DWXIter iter;
-    for (DWXObject* member = iter.Start(&container); member; member = iter.Next()) {
-        members.push_back(member);
-    }
-    return members;
-}
-
-// Exposes the slot bookkeeping of an array class for assertions.
-template <typename Array>
-class SlotView : public Array {
-  public:
-    using Array::Array;
-    using Array::operator=;
-    int Capacity() const { return this->nCapacity; }
-    int Top() const { return this->nTop; }
-    bool HasBuffer() const { return this->ppoItems != nullptr; }
-    Members Slots() const {  // slot contents below the top, empty slots as null
-        Members slots;
-        for (int i = 0; i < Top(); ++i) {
-            slots.push_back((*this)[i]);
-        }
-        return slots;
-    }
-};
-
-class BagView : public DWXBag {
-  public:
-    using DWXBag::DWXBag;
-    int Capacity() const { return nCapacity; }
-};

@@ -12,10 +12,7 @@ class CountingObject : public DWXObject {
     static int Alive() { return constructed - destroyed; }
 
     explicit CountingObject(int value = 0) : nValue(value) { ++constructed; }
-    CountingObject(const CountingObject& other) : DWXObject(other), nValue(other.nValue) {
-        ++constructed;
-    }
-    CountingObject& operator=(const CountingObject&) = default;
+    CountingObject(const CountingObject&) = delete;  // a copy would not be counted
     ~CountingObject() override { ++destroyed; }
     const char* GetClassName() const override { return "CountingObject"; }
 
