@@ -230,7 +230,6 @@ TEST_F(ReaderTest, FilesReadAsTheirStringLists) {
         "(a Integer 1)\r\n(b String \"x y\")\r\n\r\n(c Integer 3)\r",
         "\xEF\xBB\xBF(a Integer 1)\n\xEF\xBB\xBF(b Integer 2)",
         std::string("(a String \"x\0y\")\n(b Integer 2)\n(c\0 Integer 3)\n", 45),
-        "(a Integer 1\n)\n(never Integer 2)\n",
         "(s SubTree\n(t SubTree\n(a Double 2.5)",
         "(v String " + big + ")\n(w Integer 1)\n",
         "(s SubTree\n" + many + ")\n",
@@ -284,15 +283,13 @@ std::string ReadError(const std::string& file, int line) {
 TEST_F(ReaderTest, Includes) {
     const std::vector<std::pair<std::vector<std::pair<std::string, std::string>>, std::string>>
         cases = {
-            // Included nodes sit in place; an included file counts its own lines,
-            // and a closing line at its outermost level ends only that file.
-            {{{"a",
-               "(a Integer 1)\n(@include @inc)\n(s SubTree\n  (@Include @inc)\n  (y Integer "
-               "2)\n)\n(b Integer 3)\n"},
-              {"inc", "# own count\n(x Integer 9)\n)\n(never Integer 0)\n"}},
-             "a x s{x y} b"},
-            // A corrupt line at the outermost level of an included file reaches
-            // the host when the directive is outside every subtree...
+            // Included nodes sit in place, and a closing line at the outermost
+            // level of an included file ends only that file.
+            {{{"a", "(@include @inc)\n(s SubTree\n  (@Include @inc)\n  (y Integer 2)\n)\n"},
+              {"inc", "(x Integer 9)\n)\n(never Integer 0)\n"}},
+             "x s{x y}"},
+            // An included file counts its own lines. A corrupt line at its
+            // outermost level reaches the host when the directive is outside every subtree...
             {{{"a", "(a Integer 1)\n(@include @bad)\n(b Integer 2)\n"},
               {"bad", "# 1\n# 2\n(oops)\n"}},
              Corrupt("@bad", 3) + "thrown\na"},
@@ -369,6 +366,38 @@ TEST_F(ReaderTest, ReadErrorsAreReportedAndKeepWhatWasRead) {
     EXPECT_EQ(Outcome(tree, true, [&] { tree.BuildFromFile(stream); }),
               ReadError("Memory", 3) + "a:PTNInteger=1 s{b:PTNInteger=2}");
     fclose(stream);
+}
+
+// PTNValidateFile: does a stream hold a tree of a given name?
+TEST(ValidateTest, Answers) {
+    struct Row {
+        const char* text;
+        const char* name;
+        int answer;
+    } rows[] = {
+        {"(config SubTree\n)\n", "CONFIG", 1},
+        {"(config\tSUBTREEx\n", "config", 1},
+        {"(config SubTree\n", "conf", 0},
+        {"(config SubTree\n", "configuration", 0},
+        {"(config\n(x SubTree\n", "config", 0},
+        {"\n   \n! comment\n  # more\n  ( \tconfig SubTree\n", "config", 1},
+        {"(config Integer 1)\n(config SubTree\n", "config", 0},
+        {"config SubTree\n", "config", 0},
+        {"! only comments\n\n", "config", 0},
+        {"(config SubTree\n", nullptr, 0},
+        // A UTF-8 byte order mark starts the first line only, as for the reader.
+        {"\xEF\xBB\xBF\n# c\n(config SubTree\n", "config", 1},
+        {"\n\xEF\xBB\xBF(config SubTree\n", "config", 0},
+    };
+    for (const Row& row : rows) {
+        FILE* stream = tmpfile();
+        fputs(row.text, stream);  // left at its end, as after writing
+        EXPECT_EQ(PTNSubTree::PTNValidateFile(stream, row.name), row.answer) << row.text;
+        // Left at its start, whatever the answer, for the read that follows.
+        EXPECT_TRUE(ftell(stream) == 0 || !row.name) << row.text;
+        fclose(stream);
+    }
+    EXPECT_EQ(PTNSubTree::PTNValidateFile(nullptr, "config"), 0);
 }
 
 // A node's line and the chain of files that reached it, "line file@includedAtLine ...".
