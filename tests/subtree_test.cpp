@@ -14,6 +14,7 @@
 
 #include <ctype.h>
 
+#include <algorithm>
 #include <memory>
 #include <random>
 #include <string>
@@ -45,26 +46,18 @@ DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char*
     return nullptr;
 }
 
-void ExpectParents(const PTNSubTree& tree) {
+// Every parent link holds, also below; a few names and, with `all`, every name of a child in
+// its own and in upper case: the index answers as a walk of the children does.
+void ExpectLookupsAgree(const PTNSubTree& tree, const std::string& step, bool all = true) {
+    std::vector<std::string> names(std::begin(kNames), std::end(kNames));
     for (DWXParseTreeNode* child : Children(tree)) {
         ASSERT_EQ(child->GetParentRef(), &tree);
         if (auto* subtree = dynamic_cast<PTNSubTree*>(child)) {
-            ExpectParents(*subtree);
+            ExpectLookupsAgree(*subtree, step, false);
         }
-    }
-}
-
-// Every parent link holds; a few names and, with `all`, every name of a child in its own and in
-// upper case: the index answers as a walk of the children does.
-void ExpectLookupsAgree(const PTNSubTree& tree, const std::string& step, bool all = true) {
-    std::vector<std::string> names(std::begin(kNames), std::end(kNames));
-    ExpectParents(tree);
-    for (DWXParseTreeNode* child : Children(tree)) {
         if (all && child->GetName()) {
             names.push_back(child->GetName());
-            for (char& c : names.back()) {
-                c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
-            }
+            std::transform(names.back().begin(), names.back().end(), names.back().begin(), toupper);
         }
     }
     for (const std::string& name : names) {
@@ -158,45 +151,31 @@ TEST(SubTreeTest, LookupsAndMergesAgreeWithAWalkThroughEveryChange) {
             DWXParseTreeNode* some =
                 children.empty() ? nullptr : children[random() % children.size()];
             auto* subtree = dynamic_cast<PTNSubTree*>(some);
-            switch (random() % 7) {
-                case 0:
-                    tree.AddChild(NewNode(random, step));
-                    break;
-                case 1:
-                case 2:
-                    if (some) {
-                        some->SetName(random() % 9 ? NewName(random).c_str() : nullptr);
-                    }
-                    break;
-                case 3:
-                    delete some;
-                    break;
-                case 4:
-                    other.AddChild(some);  // moved, not shared
-                    break;
-                case 5:
-                    if (step % 20 == 5) {  // merged into a copy, then assigned
-                        const ExceptionList& exceptions = lists[step % 3];
-                        std::unique_ptr<PTNSubTree> copy(tree.DeepCopy()),
-                            expected(tree.DeepCopy());
-                        ExpectLookupsAgree(*copy, "copy");
-                        copy->SetFrom(&other, exceptions);
-                        ReferenceMerge(*expected, other, exceptions);
-                        ASSERT_EQ(Text(*copy), Text(*expected));
-                        other = *copy;
-                    } else if (subtree && step > 390) {
-                        tree = *subtree;  // from its own child
-                    } else {
-                        tree = static_cast<const PTNSubTree&>(tree);
-                    }
-                    break;
-                default:
-                    if (subtree) {
-                        subtree->AddChild(&tree);  // refused: an ancestor
-                        subtree->AddChild(subtree);
-                    }
-                    tree.AddChild(some);  // its own child goes to the end
-                    break;
+            const unsigned action = random() % 7;
+            if (action == 0) {
+                tree.AddChild(NewNode(random, step));
+            } else if (action <= 2 && some) {
+                some->SetName(random() % 9 ? NewName(random).c_str() : nullptr);
+            } else if (action == 3) {
+                delete some;
+            } else if (action == 4) {
+                other.AddChild(some);                    // moved, not shared
+            } else if (action == 5 && step % 20 == 5) {  // merged into a copy, then assigned
+                const ExceptionList& exceptions = lists[step % 3];
+                std::unique_ptr<PTNSubTree> copy(tree.DeepCopy()), expected(tree.DeepCopy());
+                ExpectLookupsAgree(*copy, "copy");
+                copy->SetFrom(&other, exceptions);
+                ReferenceMerge(*expected, other, exceptions);
+                ASSERT_EQ(Text(*copy), Text(*expected));
+                other = *copy;
+            } else if (action == 5) {
+                tree = subtree && step > 390 ? *subtree : tree;  // from its own child, or itself
+            } else {
+                if (subtree) {
+                    subtree->AddChild(&tree);  // refused: an ancestor
+                    subtree->AddChild(subtree);
+                }
+                tree.AddChild(some);  // its own child goes to the end
             }
             ExpectLookupsAgree(one, "one, step " + std::to_string(step), step % 20 == 0);
             ExpectLookupsAgree(two, "two, step " + std::to_string(step), step % 20 == 0);
