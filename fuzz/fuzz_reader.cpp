@@ -77,12 +77,6 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     HeapText written(tree.GetAsString());
     FUZZ_CHECK(written != nullptr);
 
-    // A read with a log throws nothing and builds the same tree.
-    PTNSubTree logged("root");
-    PTNReadLog log;
-    logged.BuildFromString(text.c_str(), &log);
-    FUZZ_CHECK(strcmp(written.get(), HeapText(logged.GetAsString()).get()) == 0);
-
     // A copy, merged with its source, comes and goes safely.
     std::unique_ptr<PTNSubTree> copy(tree.DeepCopy());
     copy->SetFrom(&tree, ExceptionList());

@@ -10,10 +10,7 @@
 
 #include <string>
 
-using dwxcore::internal::ExpandMkTokenString;
-using dwxcore::internal::ExpandTranslationCall;
-using dwxcore::internal::QuoteToken;
-using dwxcore::internal::UnquoteToken;
+using namespace dwxcore::internal;  // NOLINT: the functions under test
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     FuzzInput input(data, size);
