@@ -7,13 +7,11 @@
 #include <services/utilhub.h>
 
 #include <float.h>
-#include <limits.h>
 #include <math.h>
 #include <stdlib.h>
 
 #include <memory>
 #include <string>
-#include <vector>
 
 namespace {
 
@@ -55,16 +53,19 @@ TEST(ParseNodeTest, ReadingFromText) {
 // In order: a numeric leaf or list takes values only from its own class and
 // never empties; a string or string list does empty, and may become null.
 TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
-    const int old[] = {1, 2}, fresh[] = {5, 6, 7};
+    int old[] = {1, 2};
+    const int fresh[] = {5, 6, 7};
     const double doubles[] = {9.5};
     char* entries[] = {const_cast<char*>("keep"), nullptr};
     char* none[] = {nullptr};
     PTNSubTree parent("p");
     auto* integer = new PTNInteger("i", 5);
-    parent.AddChild(integer);
+    auto* list = new PTNIntegerList("l", 2, old);
+    parent.AddChild(integer), parent.AddChild(list);
+    old[0] = 9;  // the list copied the caller's array
     PTNInteger source("other", 9);
     PTNDouble number("d", 7.5);
-    PTNIntegerList list("l", 2, old), empty("e", 0, nullptr), same("s", 3, fresh);
+    PTNIntegerList empty("e", 0, nullptr), same("s", 3, fresh);
     PTNInteger32List other32("o", 3, fresh);
     PTNDoubleList someDoubles("d", 1, doubles), noDoubles("e", 0, nullptr);
     PTNStringList strings("l", entries), noStrings("e", none), nullStrings("n", nullptr);
@@ -76,14 +77,14 @@ TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
     } steps[] = {{integer, &number, "5"},
                  {integer, nullptr, "5"},
                  {integer, &source, "9"},
-                 {&list, &empty, "1 2"},
-                 {&list, &other32, "1 2"},
-                 {&list, &someDoubles, "1 2"},
-                 {&list, &list, "1 2"},
-                 {&list, &same, "5 6 7"},
+                 {list, &empty, "1 2"},
+                 {list, &other32, "1 2"},
+                 {list, &someDoubles, "1 2"},
+                 {list, list, "1 2"},
+                 {list, &same, "5 6 7"},
                  {&someDoubles, &noDoubles, "9.5"},
-                 {&someDoubles, &list, "9.5"},
-                 {&strings, &list, "\"keep\""},
+                 {&someDoubles, list, "9.5"},
+                 {&strings, list, "\"keep\""},
                  {&strings, &strings, "\"keep\""},
                  {&strings, &noStrings, ""},
                  {&text, &source, "\"old\""},
@@ -93,10 +94,16 @@ TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
         step.node->SetFrom(step.from);
         EXPECT_EQ(Text(*step.node), step.text) << step.node->GetName() << " " << step.text;
     }
-    same.SetValue(1, old);  // the list took a copy
-    EXPECT_EQ(Text(list), "5 6 7");
+    same.SetValue(1, old);  // the list copied this one too
+    PTNIntegerList assigned("x", 0, nullptr);
+    assigned = *list;
+    *list = PTNIntegerList("renamed", 0, nullptr);
+    EXPECT_EQ(Text(assigned), "5 6 7");
+    assigned.SetValue(1, assigned.GetValue(nullptr));  // from its own array
+    EXPECT_EQ(Text(assigned), "5");
     EXPECT_STREQ(integer->GetName(), "i");
     EXPECT_EQ(integer->GetParentRef(), &parent);
+    EXPECT_EQ(list->GetParentRef(), &parent);  // also after an assignment
     EXPECT_NE(strings.GetValue(), nullptr);
     strings.SetFrom(&nullStrings);
     EXPECT_EQ(strings.GetValue(), nullptr);
@@ -126,18 +133,6 @@ TEST(ParseNodeTest, CopiesOwnNamesAndValuesOfEveryLength) {
             }
         }
     }
-    // A list copies the caller's array and its own; assignment keeps the parent.
-    int ints[] = {3, 4};
-    PTNSubTree tree("t");
-    auto* integers = new PTNIntegerList("i", 2, ints);
-    tree.AddChild(integers);
-    ints[0] = 99;
-    PTNIntegerList assigned("x", 0, nullptr);
-    assigned = *integers;
-    *integers = PTNIntegerList("renamed", 0, nullptr);
-    EXPECT_EQ(integers->GetParentRef(), &tree);
-    assigned.SetValue(1, assigned.GetValue(nullptr));
-    EXPECT_EQ(Text(assigned), "3");
 }
 
 }  // namespace
