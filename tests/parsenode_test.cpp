@@ -12,6 +12,7 @@
 
 #include <memory>
 #include <string>
+#include <tuple>
 
 namespace {
 
@@ -70,29 +71,26 @@ TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
     PTNDoubleList someDoubles("d", 1, doubles), noDoubles("e", 0, nullptr);
     PTNStringList strings("l", entries), noStrings("e", none), nullStrings("n", nullptr);
     PTNString text("s", "old"), nullText("s", nullptr);
-    const struct {
-        DWXParseTreeNode* node;
-        DWXParseTreeNode* from;
-        const char* text;
-    } steps[] = {{integer, &number, "5"},
-                 {integer, nullptr, "5"},
-                 {integer, &source, "9"},
-                 {list, &empty, "1 2"},
-                 {list, &other32, "1 2"},
-                 {list, &someDoubles, "1 2"},
-                 {list, list, "1 2"},
-                 {list, &same, "5 6 7"},
-                 {&someDoubles, &noDoubles, "9.5"},
-                 {&someDoubles, list, "9.5"},
-                 {&strings, list, "\"keep\""},
-                 {&strings, &strings, "\"keep\""},
-                 {&strings, &noStrings, ""},
-                 {&text, &source, "\"old\""},
-                 {&text, &text, "\"old\""},
-                 {&text, &nullText, "\\q\\q"}};
-    for (const auto& step : steps) {
-        step.node->SetFrom(step.from);
-        EXPECT_EQ(Text(*step.node), step.text) << step.node->GetName() << " " << step.text;
+    const std::tuple<DWXParseTreeNode*, DWXParseTreeNode*, const char*> steps[] = {
+        {integer, &number, "5"},
+        {integer, nullptr, "5"},
+        {integer, &source, "9"},
+        {list, &empty, "1 2"},
+        {list, &other32, "1 2"},
+        {list, &someDoubles, "1 2"},
+        {list, list, "1 2"},
+        {list, &same, "5 6 7"},
+        {&someDoubles, &noDoubles, "9.5"},
+        {&someDoubles, list, "9.5"},
+        {&strings, list, "\"keep\""},
+        {&strings, &strings, "\"keep\""},
+        {&strings, &noStrings, ""},
+        {&text, &source, "\"old\""},
+        {&text, &text, "\"old\""},
+        {&text, &nullText, "\\q\\q"}};
+    for (const auto& [node, from, expected] : steps) {
+        node->SetFrom(from);
+        EXPECT_EQ(Text(*node), expected) << node->GetName() << " " << expected;
     }
     same.SetValue(1, old);  // the list copied this one too
     PTNIntegerList assigned("x", 0, nullptr);
@@ -126,9 +124,8 @@ TEST(ParseNodeTest, CopiesOwnNamesAndValuesOfEveryLength) {
             node.SetValue(node.GetValue() + (second > 0));
             EXPECT_EQ(node.GetName() + std::string("|") + node.GetValue(),
                       value.substr(second > 0) + "|" + value.substr(second > 0));
-            for (const DWXParseTreeNode* other :
-                 {static_cast<DWXParseTreeNode*>(&constructed),
-                  static_cast<DWXParseTreeNode*>(&assigned), copy.get()}) {
+            for (const PTNString* other :
+                 {&constructed, &assigned, dynamic_cast<PTNString*>(copy.get())}) {
                 EXPECT_EQ(other->GetName() + (" " + Text(*other)), value + " \"" + value + "\"");
             }
         }

@@ -12,6 +12,7 @@
 
 #include <memory>
 #include <string>
+#include <tuple>
 
 namespace {
 
@@ -32,18 +33,11 @@ TEST(WriterTest, EveryKindItsLine) {
     const double doubles[] = {1.5, -2};
     const unsigned char bytes[] = {'a', 'b'};
     char* entries[] = {const_cast<char*>("x"), const_cast<char*>("y z"), nullptr};
-    const struct {
-        DWXParseTreeNode* node;
-        PTNKind kind;
-        const char* line;
-    } rows[] = {
-        {[] {
-             auto* subtree = new PTNSubTree("t");
-             subtree->AddChild(new PTNString("fg", "red"));
-             subtree->AddChild(new PTNSubTree("e"));
-             return subtree;
-         }(),
-         PTNKind::kSubTree, "(t SubTree\n    (fg String \"red\")\n    (e SubTree\n    )\n  )"},
+    auto* nested = new PTNSubTree("t");
+    nested->BuildFromString("(fg String \"red\")\n(e SubTree\n)\n");
+    const std::tuple<DWXParseTreeNode*, PTNKind, const char*> rows[] = {
+        {nested, PTNKind::kSubTree,
+         "(t SubTree\n    (fg String \"red\")\n    (e SubTree\n    )\n  )"},
         {new PTNBool("b", 3), PTNKind::kBool, "(b Bool TRUE)"},
         {new PTNBool("no", 0), PTNKind::kBool, "(no Bool FALSE)"},
         {new PTNInteger("min", INT_MIN), PTNKind::kInteger, "(min Integer -2147483648)"},
@@ -67,10 +61,10 @@ TEST(WriterTest, EveryKindItsLine) {
     };
     PTNSubTree tree("all");
     std::string written = "(all SubTree\n";
-    for (const auto& row : rows) {
-        tree.AddChild(row.node);
-        EXPECT_EQ(PTNKindOf(row.node), row.kind) << row.line;
-        written += "  " + std::string(row.line) + "\n";
+    for (const auto& [node, kind, line] : rows) {
+        tree.AddChild(node);
+        EXPECT_EQ(PTNKindOf(node), kind) << line;
+        written += "  " + std::string(line) + "\n";
     }
     // A line longer than the block a file receives at a time.
     const std::string huge(100000, 'h');
@@ -86,10 +80,10 @@ TEST(WriterTest, EveryKindItsLine) {
     }
     EXPECT_EQ(Lines(tree), lines);
     EXPECT_EQ(Lines(tree, -1), lines);
-    EXPECT_EQ(Lines(*static_cast<PTNSubTree*>(rows[0].node), 2),
+    EXPECT_EQ(Lines(*nested, 2),
               "    (t SubTree|      (fg String \"red\")|      (e SubTree|      )|    )|");
     // A child deleted by hand leaves an empty slot behind, which writes nothing.
-    delete rows[1].node;
+    delete std::get<0>(rows[1]);
     EXPECT_EQ(Text(tree), written.erase(written.find("  (b Bool"), 16) + ")\n");
     EXPECT_EQ(PTNKindOf(nullptr), PTNKind::kOther);
     EXPECT_STREQ(PTNTypeKeyword(nullptr), "");
@@ -107,23 +101,23 @@ struct Quiet : PTNString {
     Quiet() : PTNString("q", "secret") {}
     char* GetAsString() const override { return nullptr; }
 };
-struct Group : PTNSubTree {
-    Group() : PTNSubTree("g") { AddChild(new PTNInteger("in", 1)); }
-    const char* GetClassName() const override { return "PTNGroup"; }
-};
-struct Impostor : PTNBool {
-    Impostor() : PTNBool("fake", 1) {}
-    const char* GetClassName() const override { return "ptnsubtree"; }
-};
-struct Folder : PTNSubTree {
-    Folder() : PTNSubTree("folder") { AddChild(new PTNChar("nl", '\n')); }
-    const char* GetClassName() const override { return "PTNSUBTREE"; }
+// A library class under another class name.
+template <class Base>
+struct Renamed : Base {
+    template <class... Args>
+    explicit Renamed(const char* name, Args... args) : Base(args...), pcClass(name) {}
+    const char* GetClassName() const override { return pcClass; }
+    const char* pcClass;
 };
 
 TEST(WriterTest, HostSubclassesRenderThemselves) {
+    auto* group = new Renamed<PTNSubTree>("PTNGroup", "g");
+    auto* folder = new Renamed<PTNSubTree>("PTNSUBTREE", "folder");
+    group->AddChild(new PTNInteger("in", 1)), folder->AddChild(new PTNChar("nl", '\n'));
     PTNSubTree tree("t");
     for (DWXParseTreeNode* node : std::initializer_list<DWXParseTreeNode*>{
-             new Celsius(), new Quiet(), new Group(), new Impostor(), new Folder()}) {
+             new Celsius(), new Quiet(), group, new Renamed<PTNBool>("ptnsubtree", "fake", 1),
+             folder}) {
         tree.AddChild(node);
         EXPECT_EQ(PTNKindOf(node), PTNKind::kOther);  // whatever its name says
     }
