@@ -2,16 +2,9 @@
 // copies that own their names and values.
 #include "tree_test_util.h"
 
-#include <dwxcore/dwxparse.h>
-#include <gtest/gtest.h>
-#include <services/utilhub.h>
-
 #include <float.h>
 #include <math.h>
-#include <stdlib.h>
 
-#include <memory>
-#include <string>
 #include <tuple>
 
 namespace {

@@ -4,8 +4,6 @@
 // pooled nodes must be deleted, moved and freed safely, from any thread.
 #include "tree_test_util.h"
 
-#include <dwxcore/dwxparse.h>
-#include <gtest/gtest.h>
 #include <services/portability.h>
 
 #if defined(__GLIBC__)
@@ -15,9 +13,7 @@
 #include <ctype.h>
 
 #include <algorithm>
-#include <memory>
 #include <random>
-#include <string>
 #include <thread>
 #include <vector>
 

@@ -2,16 +2,8 @@
 #include "container_test_util.h"
 #include "tree_test_util.h"
 
-#include <dwxcore/dwxparse.h>
-#include <gtest/gtest.h>
-#include <services/rtprim.h>
-#include <services/utilhub.h>
-
 #include <limits.h>
-#include <stdio.h>
 
-#include <memory>
-#include <string>
 #include <tuple>
 
 namespace {
