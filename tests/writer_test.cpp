@@ -84,11 +84,6 @@ TEST(WriterTest, EveryKindItsLine) {
 
 // Subclasses render through their own GetClassName and GetAsString, exact
 // library classes or not; only real subtrees named PTNSubTree nest.
-struct Celsius : PTNInteger {
-    Celsius() : PTNInteger("temp", 21) {}
-    const char* GetClassName() const override { return "PTNCelsius"; }
-    char* GetAsString() const override { return HSPrintf("%d C", GetValue()); }
-};
 struct Quiet : PTNString {
     Quiet() : PTNString("q", "secret") {}
     char* GetAsString() const override { return nullptr; }
@@ -108,13 +103,13 @@ TEST(WriterTest, HostSubclassesRenderThemselves) {
     group->AddChild(new PTNInteger("in", 1)), folder->AddChild(new PTNChar("nl", '\n'));
     PTNSubTree tree("t");
     for (DWXParseTreeNode* node : std::initializer_list<DWXParseTreeNode*>{
-             new Celsius(), new Quiet(), group, new Renamed<PTNBool>("ptnsubtree", "fake", 1),
-             folder}) {
+             new Renamed<PTNInteger>("PTNCelsius", "temp", 21), new Quiet(), group,
+             new Renamed<PTNBool>("ptnsubtree", "fake", 1), folder}) {
         tree.AddChild(node);
         EXPECT_EQ(PTNKindOf(node), PTNKind::kOther);  // whatever its name says
     }
     EXPECT_EQ(Lines(tree),
-              "(t SubTree|  (temp Celsius 21 C)|  (q String )|"
+              "(t SubTree|  (temp Celsius 21)|  (q String )|"
               "  (g Group (g Group\n  (in Integer 1)\n)\n)|  (fake subtree TRUE)|"
               "  (folder SUBTREE|    (nl Char \n)|  )|)|");
 }
