@@ -2,6 +2,7 @@
 #include "container_test_util.h"
 #include "tree_test_util.h"
 
+#include <float.h>
 #include <limits.h>
 
 #include <tuple>
@@ -18,8 +19,9 @@ std::string Lines(const PTNSubTree& tree, int level = 0) {
     return lines;
 }
 
-// Each kind: its line and the kind PTNKindOf names; the whole as lists at any
-// indent, a buffer and a stream.
+// Each kind: its line and the kind PTNKindOf names (doubles in the fewest
+// digits that read back exactly); the whole as lists at any indent, a buffer
+// and a stream.
 TEST(WriterTest, EveryKindItsLine) {
     const int ints[] = {1, -2};
     const double doubles[] = {1.5, -2};
@@ -39,6 +41,8 @@ TEST(WriterTest, EveryKindItsLine) {
         {new PTNChar("c0", 0), PTNKind::kChar, "(c0 Char )"},
         {new PTNFloat("f", 0.5f), PTNKind::kFloat, "(f Float 0.500000)"},
         {new PTNDouble("d", 0.1), PTNKind::kDouble, "(d Double 0.1)"},
+        {new PTNDouble("max", -DBL_MAX), PTNKind::kDouble, "(max Double -1.7976931348623157e+308)"},
+        {new PTNDouble("dn", 5e-324), PTNKind::kDouble, "(dn Double 5e-324)"},
         {new PTNString("s", "a\"b"), PTNKind::kString, "(s String \"a\\qb\")"},
         {new PTNString("n", nullptr), PTNKind::kString, "(n String \\q\\q)"},
         {new PTNStringList("sl", entries), PTNKind::kStringList, "(sl StringList \"x\" \"y z\")"},
