@@ -37,7 +37,7 @@ TEST(ParseNodeTest, ReadingFromText) {
     }
 }
 
-// In order: a numeric leaf or list takes values only from its own class and
+// In reading order: a numeric leaf or list takes values only from its own class and
 // never empties; a string or string list does empty, and may become null.
 TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
     int old[] = {1, 2};
@@ -58,21 +58,13 @@ TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
     PTNStringList strings("l", entries), noStrings("e", none), nullStrings("n", nullptr);
     PTNString text("s", "old"), nullText("s", nullptr);
     const std::tuple<DWXParseTreeNode*, DWXParseTreeNode*, const char*> steps[] = {
-        {integer, &number, "5"},
-        {integer, nullptr, "5"},
-        {integer, &source, "9"},
-        {list, &empty, "1 2"},
-        {list, &other32, "1 2"},
-        {list, &someDoubles, "1 2"},
-        {list, list, "1 2"},
-        {list, &same, "5 6 7"},
-        {&someDoubles, &noDoubles, "9.5"},
-        {&someDoubles, list, "9.5"},
-        {&strings, list, "\"keep\""},
-        {&strings, &strings, "\"keep\""},
-        {&strings, &noStrings, ""},
-        {&text, &source, "\"old\""},
-        {&text, &text, "\"old\""},
+        {integer, &number, "5"},          {integer, nullptr, "5"},
+        {integer, &source, "9"},          {list, &empty, "1 2"},
+        {list, &other32, "1 2"},          {list, list, "1 2"},
+        {list, &same, "5 6 7"},           {&someDoubles, &noDoubles, "9.5"},
+        {&someDoubles, list, "9.5"},      {&strings, list, "\"keep\""},
+        {&strings, &strings, "\"keep\""}, {&strings, &noStrings, ""},
+        {&text, &source, "\"old\""},      {&text, &text, "\"old\""},
         {&text, &nullText, "\\q\\q"}};
     for (const auto& [node, from, expected] : steps) {
         node->SetFrom(from);
