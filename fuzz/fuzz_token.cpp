@@ -10,10 +10,7 @@
 
 #include <string>
 
-using dwxcore::internal::ExpandMkTokenString;
-using dwxcore::internal::ExpandTranslationCall;
-using dwxcore::internal::QuoteToken;
-using dwxcore::internal::UnquoteToken;
+using namespace dwxcore::internal;  // NOLINT: the functions under test
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     FuzzInput input(data, size);
@@ -32,9 +29,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     // Whatever follows is a raw token and a raw value.
     const std::string raw = input.Rest();
     UnquoteToken(raw.c_str());
-    std::string list(raw);
-    ExpandMkTokenString(list);
-    std::string call(raw);
-    ExpandTranslationCall(call);
+    std::string list(raw), call(raw);
+    ExpandMkTokenString(list), ExpandTranslationCall(call);
     return 0;
 }

@@ -2,127 +2,84 @@
 // copies that own their names and values.
 #include "tree_test_util.h"
 
-#include <dwxcore/dwxparse.h>
-#include <gtest/gtest.h>
-#include <services/utilhub.h>
-
-#include <float.h>
-#include <limits.h>
-#include <math.h>
-#include <stdlib.h>
-
-#include <memory>
-#include <string>
-#include <type_traits>
-#include <vector>
+#include <tuple>
 
 namespace {
 
-template <class List>
-auto Elements(const List& list) {
-    int count = -1;
-    auto* values = list.GetValue(&count);
-    using T = std::remove_pointer_t<decltype(values)>;
-    return values != nullptr ? std::vector<T>(values, values + count) : std::vector<T>();
-}
-
+// Each text set on a Bool, Integer, Char, Double, Float, IntegerList, Integer32List
+// and DoubleList, and what they then write, joined with '|': a list takes one
+// element per word, and the Integer32List reads doubles and truncates them.
 TEST(ParseNodeTest, ReadingFromText) {
-    const struct {
-        const char* text;
-        int boolean, integer;
-        char character;
-        double number;
-        std::vector<int> integers, truncated;  // one element per word
-    } cases[] = {{"TRUE", 1, 0, 'T', 0, {0}, {0}},
-                 {"true", 1, 0, 't', 0, {0}, {0}},
-                 {"TRUE ", 0, 0, 'T', 0, {0}, {0}},
-                 {"12abc", 0, 12, '1', 12, {12}, {12}},
-                 {" -7", 0, -7, ' ', -7, {-7}, {-7}},
-                 {"1e3 2.9 -2.9", 0, 1, '1', 1000, {1, 2, -2}, {1000, 2, -2}},
-                 {" 4\tx\n5 ", 0, 4, ' ', 4, {4, 0, 5}, {4, 0, 5}},
-                 {"1", 0, 1, '1', 1, {1}, {1}},
-                 {"", 0, 0, 0, 0, {}, {}},
-                 {nullptr, 0, 0, 0, 0, {}, {}}};
+    const char* const cases[][2] = {
+        {"TRUE", "|TRUE|0|T|0|0.000000|0|0.000000|0"},
+        {"true", "|TRUE|0|t|0|0.000000|0|0.000000|0"},
+        {"TRUE ", "|FALSE|0|T|0|0.000000|0|0.000000|0"},
+        {"12abc", "|FALSE|12|1|12|12.000000|12|12.000000|12"},
+        {" -7", "|FALSE|-7| |-7|-7.000000|-7|-7.000000|-7"},
+        {"1e3 2.9 -2.9",
+         "|FALSE|1|1|1000|1000.000000|1 2 -2|1000.000000 2.000000 -2.000000|1000 2.9 -2.9"},
+        {" 4\tx\n5 ", "|FALSE|4| |4|4.000000|4 0 5|4.000000 0.000000 5.000000|4 0 5"},
+        {"1", "|FALSE|1|1|1|1.000000|1|1.000000|1"},
+        {"", "|FALSE|0||0|0.000000|||"},
+        {nullptr, "|FALSE|0||0|0.000000|||"},
+        {"1e20 -1e20 nan",
+         "|FALSE|1|1|1e+20|100000002004087734272.000000|1 -1 0|2147483647.000000 "
+         "-2147483648.000000 0.000000|1e+20 -1e+20 nan"}};  // clamped, not undefined, beyond the
+                                                            // range of int
     for (const auto& c : cases) {
         const int old[] = {42};
-        PTNBool boolean("b", 9);
-        PTNInteger integer("i", 9);
-        PTNChar character("c", 'q');
-        PTNDouble number("d", 9);
-        PTNFloat single("f", 9);
-        PTNIntegerList integers("l", 1, old);
-        PTNInteger32List truncated("l", 1, old);
-        boolean.SetAsString(c.text), integer.SetAsString(c.text), character.SetAsString(c.text);
-        number.SetAsString(c.text), single.SetAsString(c.text);
-        integers.SetAsString(c.text), truncated.SetAsString(c.text);
-        const char* label = c.text ? c.text : "(null)";
-        EXPECT_EQ(boolean.GetValue(), c.boolean) << label;
-        EXPECT_EQ(integer.GetValue(), c.integer) << label;
-        EXPECT_EQ(character.GetValue(), c.character) << label;
-        EXPECT_EQ(number.GetValue(), c.number) << label;
-        EXPECT_EQ(single.GetValue(), static_cast<float>(c.number)) << label;
-        EXPECT_EQ(Elements(integers), c.integers) << label;
-        EXPECT_EQ(Elements(truncated), c.truncated) << label;
-    }
-    // Beyond the range of int, truncation clamps instead of being undefined.
-    PTNInteger32List list("l", 0, nullptr);
-    list.SetAsString("1e20 -1e20 nan");
-    EXPECT_EQ(Elements(list), (std::vector<int>{INT_MAX, INT_MIN, 0}));
-    PTNDoubleList doubles("l", 0, nullptr);
-    doubles.SetAsString("1e3 x -2.5");
-    EXPECT_EQ(Elements(doubles), (std::vector<double>{1000, 0, -2.5}));
-    // Doubles are written so that they read back exactly.
-    for (double value : {1.0 / 3.0, 1e300, 5e-324, -DBL_MAX, static_cast<double>(INFINITY)}) {
-        EXPECT_EQ(atof(Text(PTNDouble("d", value)).c_str()), value);
+        std::string values;
+        auto read = [&](auto&& node) { node.SetAsString(c[0]), values += "|" + Text(node); };
+        read(PTNBool("b", 9)), read(PTNInteger("i", 9)), read(PTNChar("c", 'q'));
+        read(PTNDouble("d", 9)), read(PTNFloat("f", 9)), read(PTNIntegerList("l", 1, old));
+        read(PTNInteger32List("l", 1, old)), read(PTNDoubleList("l", 0, nullptr));
+        EXPECT_EQ(values, c[1]) << (c[0] ? c[0] : "(null)");
     }
 }
 
-// In order: a numeric leaf or list takes values only from its own class and
+// In reading order: a numeric leaf or list takes values only from its own class and
 // never empties; a string or string list does empty, and may become null.
 TEST(ParseNodeTest, SetFromTakesValuesOnlyFromTheSameClass) {
-    const int old[] = {1, 2}, fresh[] = {5, 6, 7};
+    int old[] = {1, 2};
+    const int fresh[] = {5, 6, 7};
     const double doubles[] = {9.5};
     char* entries[] = {const_cast<char*>("keep"), nullptr};
     char* none[] = {nullptr};
     PTNSubTree parent("p");
     auto* integer = new PTNInteger("i", 5);
-    parent.AddChild(integer);
+    auto* list = new PTNIntegerList("l", 2, old);
+    parent.AddChild(integer), parent.AddChild(list);
+    old[0] = 9;  // the list copied the caller's array
     PTNInteger source("other", 9);
     PTNDouble number("d", 7.5);
-    PTNIntegerList list("l", 2, old), empty("e", 0, nullptr), same("s", 3, fresh);
+    PTNIntegerList empty("e", 0, nullptr), same("s", 3, fresh);
     PTNInteger32List other32("o", 3, fresh);
     PTNDoubleList someDoubles("d", 1, doubles), noDoubles("e", 0, nullptr);
     PTNStringList strings("l", entries), noStrings("e", none), nullStrings("n", nullptr);
     PTNString text("s", "old"), nullText("s", nullptr);
-    const struct {
-        DWXParseTreeNode* node;
-        DWXParseTreeNode* from;
-        const char* text;
-    } steps[] = {{integer, &number, "5"},
-                 {integer, nullptr, "5"},
-                 {integer, &source, "9"},
-                 {&list, &empty, "1 2"},
-                 {&list, &other32, "1 2"},
-                 {&list, &someDoubles, "1 2"},
-                 {&list, &list, "1 2"},
-                 {&list, &same, "5 6 7"},
-                 {&someDoubles, &noDoubles, "9.5"},
-                 {&someDoubles, &list, "9.5"},
-                 {&strings, &list, "\"keep\""},
-                 {&strings, &strings, "\"keep\""},
-                 {&strings, &noStrings, ""},
-                 {&text, &source, "\"old\""},
-                 {&text, &text, "\"old\""},
-                 {&text, &nullText, "\\q\\q"}};
-    for (const auto& step : steps) {
-        step.node->SetFrom(step.from);
-        EXPECT_EQ(Text(*step.node), step.text) << step.node->GetName() << " " << step.text;
+    const std::tuple<DWXParseTreeNode*, DWXParseTreeNode*, const char*> steps[] = {
+        {integer, &number, "5"},          {integer, nullptr, "5"},
+        {integer, &source, "9"},          {list, &empty, "1 2"},
+        {list, &other32, "1 2"},          {list, list, "1 2"},
+        {list, &same, "5 6 7"},           {&someDoubles, &noDoubles, "9.5"},
+        {&someDoubles, list, "9.5"},      {&strings, list, "\"keep\""},
+        {&strings, &strings, "\"keep\""}, {&strings, &noStrings, ""},
+        {&text, &source, "\"old\""},      {&text, &text, "\"old\""},
+        {&text, &nullText, "\\q\\q"}};
+    for (const auto& [node, from, expected] : steps) {
+        node->SetFrom(from);
+        EXPECT_EQ(Text(*node), expected) << node->GetName() << " " << expected;
     }
-    same.SetValue(1, old);  // the list took a copy
-    EXPECT_EQ(Text(list), "5 6 7");
+    same.SetValue(1, old);  // the list copied this one too
+    PTNIntegerList assigned("x", 0, nullptr);
+    assigned = *list;
+    *list = PTNIntegerList("renamed", 0, nullptr);
+    EXPECT_EQ(Text(assigned), "5 6 7");
+    assigned.SetValue(1, assigned.GetValue(nullptr));  // from its own array
+    EXPECT_EQ(Text(assigned), "5");
     EXPECT_STREQ(integer->GetName(), "i");
     EXPECT_EQ(integer->GetParentRef(), &parent);
-    EXPECT_NE(strings.GetValue(), nullptr);
+    EXPECT_EQ(list->GetParentRef(), &parent);  // also after an assignment
     strings.SetFrom(&nullStrings);
     EXPECT_EQ(strings.GetValue(), nullptr);
 }
@@ -144,25 +101,12 @@ TEST(ParseNodeTest, CopiesOwnNamesAndValuesOfEveryLength) {
             node.SetValue(node.GetValue() + (second > 0));
             EXPECT_EQ(node.GetName() + std::string("|") + node.GetValue(),
                       value.substr(second > 0) + "|" + value.substr(second > 0));
-            for (const DWXParseTreeNode* other :
-                 {static_cast<DWXParseTreeNode*>(&constructed),
-                  static_cast<DWXParseTreeNode*>(&assigned), copy.get()}) {
+            for (const PTNString* other :
+                 {&constructed, &assigned, dynamic_cast<PTNString*>(copy.get())}) {
                 EXPECT_EQ(other->GetName() + (" " + Text(*other)), value + " \"" + value + "\"");
             }
         }
     }
-    // A list copies the caller's array and its own; assignment keeps the parent.
-    int ints[] = {3, 4};
-    PTNSubTree tree("t");
-    auto* integers = new PTNIntegerList("i", 2, ints);
-    tree.AddChild(integers);
-    ints[0] = 99;
-    PTNIntegerList assigned("x", 0, nullptr);
-    assigned = *integers;
-    *integers = PTNIntegerList("renamed", 0, nullptr);
-    EXPECT_EQ(integers->GetParentRef(), &tree);
-    assigned.SetValue(1, assigned.GetValue(nullptr));
-    EXPECT_EQ(Text(assigned), "3");
 }
 
 }  // namespace

@@ -4,8 +4,6 @@
 // pooled nodes must be deleted, moved and freed safely, from any thread.
 #include "tree_test_util.h"
 
-#include <dwxcore/dwxparse.h>
-#include <gtest/gtest.h>
 #include <services/portability.h>
 
 #if defined(__GLIBC__)
@@ -14,9 +12,8 @@
 
 #include <ctype.h>
 
-#include <memory>
+#include <algorithm>
 #include <random>
-#include <string>
 #include <thread>
 #include <vector>
 
@@ -25,18 +22,9 @@ namespace {
 const char* const kNames[] = {"a", "A", "b", "width", "WIDTH", "Width", "long_name_x", "c"};
 const char* const kTypes[] = {nullptr, "PTNInteger", "ptnstring", "PTNSubTree", "Integer"};
 
-// The children as the range-for gives them; the index is not used.
-std::vector<DWXParseTreeNode*> Children(const PTNSubTree& tree) {
-    std::vector<DWXParseTreeNode*> children;
-    for (DWXParseTreeNode* child : tree) {
-        children.push_back(child);
-    }
-    return children;
-}
-
 // The first child a walk finds by name, and class when given.
 DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char* type) {
-    for (DWXParseTreeNode* child : Children(tree)) {
+    for (DWXParseTreeNode* child : tree) {
         if (name && child->GetName() && _stricmp(child->GetName(), name) == 0 &&
             (!type || _stricmp(child->GetClassName(), type) == 0)) {
             return child;
@@ -45,43 +33,29 @@ DWXParseTreeNode* WalkFind(const PTNSubTree& tree, const char* name, const char*
     return nullptr;
 }
 
-void ExpectParents(const PTNSubTree& tree) {
-    for (DWXParseTreeNode* child : Children(tree)) {
-        ASSERT_EQ(child->GetParentRef(), &tree);
-        if (auto* subtree = dynamic_cast<PTNSubTree*>(child)) {
-            ExpectParents(*subtree);
-        }
-    }
-}
-
 // Every parent link holds; a few names and, with `all`, every name of a child in its own and in
-// upper case: the index answers as a walk of the children does.
+// upper case, and the same one level below: the index answers as a walk of the children does.
 void ExpectLookupsAgree(const PTNSubTree& tree, const std::string& step, bool all = true) {
     std::vector<std::string> names(std::begin(kNames), std::end(kNames));
-    ExpectParents(tree);
-    for (DWXParseTreeNode* child : Children(tree)) {
+    for (DWXParseTreeNode* child : tree) {
+        ASSERT_EQ(child->GetParentRef(), &tree);
+        if (auto* subtree = dynamic_cast<PTNSubTree*>(child); subtree && all) {
+            ExpectLookupsAgree(*subtree, step, false);  // the random subtrees nest one level
+        }
         if (all && child->GetName()) {
             names.push_back(child->GetName());
-            for (char& c : names.back()) {
-                c = static_cast<char>(toupper(static_cast<unsigned char>(c)));
-            }
+            std::transform(names.back().begin(), names.back().end(), names.back().begin(), toupper);
         }
     }
     for (const std::string& name : names) {
-        int count = 0;
-        for (DWXParseTreeNode* child : Children(tree)) {
-            count += child->GetName() && _stricmp(child->GetName(), name.c_str()) == 0;
-        }
+        const auto count = std::count_if(tree.begin(), tree.end(), [&](DWXParseTreeNode* child) {
+            return child->GetName() && _stricmp(child->GetName(), name.c_str()) == 0;
+        });
         ASSERT_EQ(tree.GetNumberOfOccurence(name.c_str()), count) << step << " " << name;
         for (const char* type : kTypes) {
             ASSERT_EQ(tree.GetChild(name.c_str(), type), WalkFind(tree, name.c_str(), type))
                 << step << " " << name << " " << (type ? type : "any");
         }
-        auto* first = WalkFind(tree, name.c_str(), nullptr);
-        auto* number = dynamic_cast<PTNInteger*>(first);
-        auto* text = dynamic_cast<PTNString*>(first);
-        ASSERT_EQ(tree.GetChildAsInteger(name.c_str()), number ? number->GetValue() : 0) << step;
-        ASSERT_STREQ(tree.GetChildAsString(name.c_str()), text ? text->GetValue() : "") << step;
     }
 }
 
@@ -116,7 +90,7 @@ DWXParseTreeNode* NewNode(std::mt19937& random, int value, int depth = 1) {
 
 // A merge as the plain recursive walk does it.
 void ReferenceMerge(PTNSubTree& tree, PTNSubTree& other, const ExceptionList& exceptions) {
-    for (DWXParseTreeNode* child : Children(tree)) {
+    for (DWXParseTreeNode* child : tree) {
         if (exceptions.IsMember(child->GetName())) {
             continue;
         }
@@ -133,17 +107,23 @@ void ReferenceMerge(PTNSubTree& tree, PTNSubTree& other, const ExceptionList& ex
 
 // Random appends, renames, deletions by hand, moves between two trees,
 // refused adoptions of an ancestor, copies, merges and assignments (also
-// from itself and from its own child), on trees
-// below and far above the index threshold: after every step both trees
-// answer as a walk does, and every merge does what the recursive walk does.
+// from itself and from its own child), on trees below and far above the index
+// threshold: after every step both trees answer as a walk does, and every
+// merge, with exception lists copied deeply, does what the recursive walk does.
 TEST(SubTreeTest, LookupsAndMergesAgreeWithAWalkThroughEveryChange) {
-    ExceptionList lists[3];  // none, a few, and more than a walk of the list suits
+    ExceptionList lists[3], many;  // none, a few, and more than a walk of the list suits
     for (const char* name : {"WIDTH", "one", "two"}) {  // the roots are never compared
         lists[1].Add(name);
     }
+    many.Add(nullptr);
     for (const char* name : {"A", "B", "LONG_NAME_X", "f1", "f2", "f3", "f4", "f5", "f6", "f7"}) {
-        lists[2].Add(name);
+        many.Add(name);
     }
+    lists[2].Add("old");
+    lists[2] = many, lists[1] = ExceptionList(lists[1]), many = ExceptionList();  // deep copies
+    EXPECT_EQ(lists[2].IsMember("long_name_x") + lists[1].IsMember("Width") + many.IsMember("A"),
+              2);
+    EXPECT_EQ(lists[2].IsMember("old") + lists[2].IsMember("LONG_NAME_"), 0);
     for (int size : {4, 12, 300}) {
         std::mt19937 random(static_cast<unsigned>(size));
         PTNSubTree one("one"), two("two");
@@ -154,49 +134,35 @@ TEST(SubTreeTest, LookupsAndMergesAgreeWithAWalkThroughEveryChange) {
         for (int step = 0; step < 400; ++step) {
             PTNSubTree& tree = random() % 2 ? one : two;
             PTNSubTree& other = &tree == &one ? two : one;
-            std::vector<DWXParseTreeNode*> children = Children(tree);
+            std::vector<DWXParseTreeNode*> children(tree.begin(), tree.end());
             DWXParseTreeNode* some =
                 children.empty() ? nullptr : children[random() % children.size()];
             auto* subtree = dynamic_cast<PTNSubTree*>(some);
-            switch (random() % 7) {
-                case 0:
-                    tree.AddChild(NewNode(random, step));
-                    break;
-                case 1:
-                case 2:
-                    if (some) {
-                        some->SetName(random() % 9 ? NewName(random).c_str() : nullptr);
-                    }
-                    break;
-                case 3:
-                    delete some;
-                    break;
-                case 4:
-                    other.AddChild(some);  // moved, not shared
-                    break;
-                case 5:
-                    if (step % 20 == 5) {  // merged into a copy, then assigned
-                        const ExceptionList& exceptions = lists[step % 3];
-                        std::unique_ptr<PTNSubTree> copy(tree.DeepCopy()),
-                            expected(tree.DeepCopy());
-                        ExpectLookupsAgree(*copy, "copy");
-                        copy->SetFrom(&other, exceptions);
-                        ReferenceMerge(*expected, other, exceptions);
-                        ASSERT_EQ(Text(*copy), Text(*expected));
-                        other = *copy;
-                    } else if (subtree && step > 390) {
-                        tree = *subtree;  // from its own child
-                    } else {
-                        tree = static_cast<const PTNSubTree&>(tree);
-                    }
-                    break;
-                default:
-                    if (subtree) {
-                        subtree->AddChild(&tree);  // refused: an ancestor
-                        subtree->AddChild(subtree);
-                    }
-                    tree.AddChild(some);  // its own child goes to the end
-                    break;
+            const unsigned action = random() % 7;
+            if (action == 0) {
+                tree.AddChild(NewNode(random, step));
+            } else if (action <= 2 && some) {
+                some->SetName(random() % 9 ? NewName(random).c_str() : nullptr);
+            } else if (action == 3) {
+                delete some;
+            } else if (action == 4) {
+                other.AddChild(some);                    // moved, not shared
+            } else if (action == 5 && step % 20 == 5) {  // merged into a copy, then assigned
+                const ExceptionList& exceptions = lists[step % 3];
+                std::unique_ptr<PTNSubTree> copy(tree.DeepCopy()), expected(tree.DeepCopy());
+                ExpectLookupsAgree(*copy, "copy");
+                copy->SetFrom(&other, exceptions);
+                ReferenceMerge(*expected, other, exceptions);
+                ASSERT_EQ(Text(*copy), Text(*expected));
+                other = *copy;
+            } else if (action == 5) {
+                tree = subtree && step > 390 ? *subtree : tree;  // from its own child, or itself
+            } else {
+                if (subtree) {
+                    subtree->AddChild(&tree);  // refused: an ancestor
+                    subtree->AddChild(subtree);
+                }
+                tree.AddChild(some);  // its own child goes to the end
             }
             ExpectLookupsAgree(one, "one, step " + std::to_string(step), step % 20 == 0);
             ExpectLookupsAgree(two, "two, step " + std::to_string(step), step % 20 == 0);
@@ -204,19 +170,22 @@ TEST(SubTreeTest, LookupsAndMergesAgreeWithAWalkThroughEveryChange) {
     }
 }
 
-TEST(SubTreeTest, TypedReadersTakeTheFirstNamesakeOfTheirClass) {
-    char* list[] = {const_cast<char*>("x"), nullptr};
-    PTNSubTree tree("t");
-    for (DWXParseTreeNode* node : std::initializer_list<DWXParseTreeNode*>{
-             new PTNString("a", "first"), new PTNInteger("a", 2), new PTNBool("flag", 5),
-             new PTNInteger("WIDTH", 640), new PTNChar("c", 'q'), new PTNDouble("d", 2.5),
-             new PTNStringList("list", list), new PTNInteger(nullptr, 1)}) {
-        tree.AddChild(node);
-    }
-    EXPECT_EQ(tree.GetChildAsBool("flag") + tree.GetChildAsInteger("flag"), 10);
+// Typed readers take the first namesake and read it only when it is of their
+// class; paths step through subtrees by name and index, and brackets are always an index.
+TEST(SubTreeTest, TypedReadersAndPaths) {
+    PTNSubTree tree("root");
+    tree.BuildFromString(
+        "(viewer SubTree\n(window SubTree\n(width Integer 640)\n)\n(title String \"t\")\n"
+        "(window SubTree\n(width Integer 800)\n)\n(Window Integer 3)\n)\n(a[0] Integer 9)\n"
+        "(a String \"first\")\n(a Integer 2)\n(flag Bool TRUE)\n(WIDTH Integer 640)\n(c Char q)\n"
+        "(d Double 2.5)\n(list StringList \"x\")\n");
+    tree.AddChild(new PTNInteger(nullptr, 1));
+    PTNSubTree source("s");  // a merge from nothing, or as a leaf would, changes nothing
+    source.AddChild(new PTNChar("c", 'z'));
+    tree.SetFrom(nullptr, ExceptionList()), tree.SetFrom(static_cast<DWXParseTreeNode*>(&source));
+    EXPECT_EQ(tree.GetChildAsBool("flag") + tree.GetChildAsInteger("flag"), 2);
     EXPECT_EQ(tree.GetChildAsBool("width"), 640);
-    EXPECT_EQ(tree.GetChildAsChar("c"), 'q');
-    EXPECT_EQ(tree.GetChildAsDouble("d"), 2.5);
+    EXPECT_EQ(tree.GetChildAsChar("c") + tree.GetChildAsDouble("d"), 'q' + 2.5);
     EXPECT_STREQ(tree.GetChildAsStringList("list")[0], "x");
     // Absent, null, or a first namesake of another class: the defaults.
     for (const char* name : {"absent", static_cast<const char*>(nullptr), "a"}) {
@@ -226,52 +195,23 @@ TEST(SubTreeTest, TypedReadersTakeTheFirstNamesakeOfTheirClass) {
     EXPECT_EQ(tree.GetChildAsBool("absent") + tree.GetChildAsBool(nullptr), 0);
     EXPECT_EQ(tree.GetNumberOfOccurence(nullptr) + (tree.GetChild(nullptr) != nullptr), 0);
     EXPECT_STREQ(tree.GetChildAsString("d"), "");
-}
 
-// Exception lists are copied deeply; a merge from nothing, or as a leaf
-// would, changes nothing.
-TEST(SubTreeTest, ExceptionListCopiesAndEmptyMerges) {
-    ExceptionList list, copied, other;
-    list.Add(nullptr);
-    for (int i = 0; i < 20; ++i) {
-        list.Add(("name" + std::to_string(i)).c_str());
-    }
-    other.Add("old");
-    copied = ExceptionList(list);
-    other = list;
-    list = ExceptionList();
-    EXPECT_EQ(list.IsMember("name1") + other.IsMember("old") + copied.IsMember("NAME190"), 0);
-    EXPECT_EQ(other.IsMember("NAME19") + copied.IsMember("name0"), 2);
-    PTNSubTree tree("t"), source("s");
-    tree.AddChild(new PTNInteger("x", 1));
-    source.AddChild(new PTNInteger("x", 2));
-    tree.SetFrom(nullptr, ExceptionList());
-    tree.SetFrom(static_cast<DWXParseTreeNode*>(&source));
-    EXPECT_EQ(tree.GetChildAsInteger("x"), 1);
-}
-
-TEST(SubTreeTest, Paths) {
-    PTNSubTree tree("root");
-    tree.BuildFromString(
-        "(viewer SubTree\n(window SubTree\n(width Integer 640)\n)\n(title String \"t\")\n"
-        "(window SubTree\n(width Integer 800)\n)\n(Window Integer 3)\n)\n(a[0] Integer 9)\n");
     std::string found;
     for (const char* path :
          {"VIEWER/Window/WIDTH", "viewer/window[0]/width", "viewer/window[1]/width",
-          "viewer/window[01]/width", "viewer/window[2]", "viewer/title"}) {
+          "viewer/window[01]/width", "viewer/window[2]", "viewer/title", "a[0]"}) {
         DWXParseTreeNode* node = tree.Find(path);
         found += (node ? Text(*node) : "null") + " ";
     }
-    EXPECT_EQ(found, "640 640 800 800 3 \"t\" ");  // namesakes count whatever their class
+    EXPECT_EQ(found, "640 640 800 800 3 \"t\" \"first\" ");  // namesakes of any class count
     // Not there, through a leaf, and malformed; brackets are always an index.
     for (const char* path :
          {"viewer/window[3]", "viewer/title/x", "viewer/nothere/width", "", "/viewer", "viewer/",
           "viewer//window", "viewer/window[]", "viewer/window[x]", "viewer/window[-1]",
           "viewer/window[1", "viewer/window[1]x", "viewer/window[99999999999]", "viewer/[0]",
-          "a[0]", static_cast<const char*>(nullptr)}) {
+          static_cast<const char*>(nullptr)}) {
         EXPECT_EQ(tree.Find(path), nullptr) << (path ? path : "(null)");
     }
-    EXPECT_EQ(tree.FindAs<PTNString>("viewer/window/width"), nullptr);
 }
 
 struct BigNode : PTNInteger {  // larger than the pool carves
@@ -287,30 +227,27 @@ struct LateMaker {
 
 // Trees built on four threads, half of them deleted on the main thread.
 TEST(NodePoolTest, TreesOnSeparateThreadsAndDeletedOnAnother) {
-    std::vector<std::vector<PTNSubTree*>> handOver(4);
+    std::vector<std::unique_ptr<PTNSubTree>> handOver[4];
     std::vector<std::thread> threads;
     for (int t = 0; t < 4; ++t) {
-        threads.emplace_back([t, &trees = handOver[static_cast<size_t>(t)]] {
+        threads.emplace_back([t, &trees = handOver[t]] {
             thread_local LateMaker maker;
             (void)&maker;
             for (int round = 0; round < 20; ++round) {
-                auto* tree = new PTNSubTree("t");
+                std::unique_ptr<PTNSubTree> tree(new PTNSubTree("t"));
                 for (int i = 0; i < 500; ++i) {
                     tree->AddChild(new PTNInteger(std::to_string(i).c_str(), t + i));
                 }
                 tree->AddChild(new BigNode);
                 EXPECT_EQ(tree->GetChildAsInteger("499") + tree->GetChildAsInteger("big"), t + 506);
-                round % 2 ? trees.push_back(tree) : delete tree;
+                if (round % 2) {
+                    trees.push_back(std::move(tree));
+                }
             }
         });
     }
     for (std::thread& thread : threads) {
         thread.join();
-    }
-    for (auto& trees : handOver) {
-        for (PTNSubTree* tree : trees) {
-            delete tree;
-        }
     }
 }
 
