@@ -31,10 +31,9 @@ TEST(ColorPreferenceTest, StoresRedGreenBlueAsCommaText) {
     DWXColor odd(0, 300, -1, 7);
     EXPECT_TRUE(Store(assigned, "Odd", &odd));
     EXPECT_EQ(model.oTexts["Odd"], "44,255,7");
+    EXPECT_FALSE(Store(format, "Other", nullptr) || format.SetPreference("Other", nullptr));
     model.bAccept = false;  // the model's answer is passed on
     EXPECT_FALSE(Store(format, "Other", &odd));
-    model.bAccept = true;
-    EXPECT_FALSE(Store(format, "Other", nullptr) || format.SetPreference("Other", nullptr));
     EXPECT_EQ(model.oTexts.count("Other"), 0u);
 
     // Without a model the default is copied and nothing stored.
@@ -56,14 +55,11 @@ TEST(ColorPreferenceTest, ReadsTheKeyThenComponentKeysThenTheDefault) {
         model.oTexts[prefix + "BlueColor"] = "300";
     }
     DWXColorPreferenceFormat format(&model);
-    const char* found[][2] = {{"Line", "255 10 20 30"},
-                              {"Wide", "255 44 0 255"},
-                              {"Words", "255 0 0 0"},
-                              {"Color", "255 1 2 44"},
-                              {"BackColor", "255 1 2 44"}};
-    for (const auto& c : found) {
-        EXPECT_EQ(Read(format, nullptr, c[0]), c[1]) << c[0];
+    std::string found;
+    for (const char* key : {"Line", "Wide", "Words", "Color", "BackColor"}) {
+        found += Read(format, nullptr, key) + "|";
     }
+    EXPECT_EQ(found, "255 10 20 30|255 44 0 255|255 0 0 0|255 1 2 44|255 1 2 44|");
     // Malformed text never leads to the component keys; HalfColor lacks one;
     // in ColorColor the first "Color" is not the end.
     DWXColor fallback(0, 9, 9, 9);
