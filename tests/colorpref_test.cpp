@@ -75,10 +75,9 @@ TEST(ColorPreferenceTest, ReadsTheKeyThenComponentKeysThenTheDefault) {
     model.bOneBuffer = true;
     EXPECT_EQ(Read(format, nullptr, "HalfColor"), "null");
     EXPECT_EQ(Read(format, nullptr, "BackColor"), "255 1 2 44");
-    const std::vector<std::string> lookups = {"HalfColor",      "HalfRedColor", "HalfGreenColor",
-                                              "HalfBlueColor",  "BackColor",    "BackRedColor",
-                                              "BackGreenColor", "BackBlueColor"};
-    EXPECT_EQ(model.oLookups, lookups);
+    EXPECT_EQ(model.oLookups, (std::vector<std::string>{
+                                  "HalfColor", "HalfRedColor", "HalfGreenColor", "HalfBlueColor",
+                                  "BackColor", "BackRedColor", "BackGreenColor", "BackBlueColor"}));
 }
 
 TEST(PreferenceModelTest, StoresStringChildrenThatComeBackFromTheFile) {
