@@ -53,10 +53,9 @@ inline std::vector<Option> Model(const std::vector<std::string>& args) {
 inline std::string Mismatch(const DWXCmdLine& parser, const std::vector<Option>& model,
                             const std::string& probe) {
     static const char kDefault[] = "default";
-    auto folded = [](std::string name) {
-        for (char& c : name) {
+    auto folded = [](std::string name) {  // ASCII only, whatever the locale
+        for (char& c : name)
             c = c >= 'A' && c <= 'Z' ? static_cast<char>(c | 0x20) : c;
-        }
         return name;
     };
     std::vector<std::string> names{probe};

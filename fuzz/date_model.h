@@ -115,11 +115,8 @@ struct DateModel {
                    (IsMonth(m) ? Saturate(Number(d) - DayNumber(1, 1, y) + 1) : 0));
         CheckText(d);
         DWXDate stepped(d), moved(d);
-        for (int i = 0; i < days; ++i) {
-            ++stepped;
-        }
-        for (int i = 0; i > days; --i) {
-            --stepped;
+        for (int i = 0; i != days; i += days > 0 ? 1 : -1) {
+            days > 0 ? ++stepped : --stepped;
         }
         moved.addDay(days);
         FUZZ_CHECK(stepped == moved);
