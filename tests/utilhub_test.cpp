@@ -79,7 +79,8 @@ TEST(UtilhubStringList, AppendsToCopiesAndToListsBuiltByHand) {
     char** list = AddStringList(AddStringToList(AddStringToList(nullptr, "one"), nullptr), nullptr);
     char** copy = DuplicateStringList(list);
     EXPECT_NE(copy[0], list[0]);
-    list = AddStringList(AddStringList(list, copy), list);  // appending a list to itself doubles it
+    list = AddStringList(list, copy);
+    list = AddStringList(list, list);  // appending a list to itself doubles it
     EXPECT_EQ(Consume(copy), "one//");
     EXPECT_EQ(Consume(list), "one//one//one//one//");
 
