@@ -215,12 +215,11 @@ TEST(UtilhubFiles, CheckingFindingAndReading) {
 TEST(UtilhubText, ExpandWhiteSpaceFormattingAndToday) {
     setenv("UTILHUB_DIR", "/opt/conf", 1);
     unsetenv("UTILHUB_UNSET");
-    for (const auto& [text, expanded] : std::initializer_list<std::pair<const char*, const char*>>{
-             {"${UTILHUB_DIR}x[$UTILHUB_UNSET]$UTILHUB_DIR/a", "/opt/confx[]/opt/conf/a"},
-             {"$5 $ ${} a$ ${UTILHUB_DIR", "$5 $ ${} a$ ${UTILHUB_DIR"},
-             {"$$UTILHUB_DIR", "$/opt/conf"}}) {
-        EXPECT_EQ(Owned(HStringExpand(text)), expanded);
-    }
+    EXPECT_EQ(Owned(HStringExpand("${UTILHUB_DIR}x[$UTILHUB_UNSET]$UTILHUB_DIR/a")),
+              "/opt/confx[]/opt/conf/a");
+    // What is no variable keeps its '$'.
+    EXPECT_EQ(Owned(HStringExpand("$$UTILHUB_DIR $ ${} $5 a$ ${UTILHUB_DIR")),
+              "$/opt/conf $ ${} $5 a$ ${UTILHUB_DIR");
     EXPECT_EQ(HStringExpand(nullptr), nullptr);
 
     char trailing[] = " \v\f a b \t\r\n";
