@@ -65,9 +65,8 @@ TEST(UtilhubStringList, Tokenize) {
         {",,,", ",", ""}};
     for (const Case& c : cases) {
         const char* text = c.text.c_str();
-        EXPECT_EQ(Consume(c.delimiters ? TokenizeDelim(text, c.delimiters) : Tokenize(text)),
-                  c.tokens)
-            << c.text.substr(0, 40);
+        char** list = c.delimiters ? TokenizeDelim(text, c.delimiters) : Tokenize(text);
+        EXPECT_EQ(Consume(list), c.tokens) << c.text.substr(0, 40);
     }
     EXPECT_EQ(Consume(Tokenize(nullptr)) + Consume(TokenizeDelim(nullptr, ",")), "");
 }
@@ -103,6 +102,14 @@ TEST(UtilhubStringList, AppendsToCopiesAndToListsBuiltByHand) {
 
 // Files, buffers, the list readers and the line reader split lines alike.
 TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
+    // Lines of every length around the readers' block boundaries, then many short ones.
+    std::string many, manyLines;
+    for (int i = 0; i < 300000; ++i) {
+        std::string line(many.size() < 700000 ? static_cast<size_t>(i) : 1,
+                         static_cast<char>('a' + i % 26));
+        many += line + (i % 3 ? "\n" : "\r\n");
+        manyLines += line + "/";
+    }
     const std::string l3(300000, 'L');
     const std::pair<std::string, std::string> cases[] = {
         {"\n", "/"},  // first, so that a fresh reader's first line is empty
@@ -115,39 +122,30 @@ TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
         {l3 + "\r\nshort\r", l3 + "/short/"},
         // A file line ends at its first NUL byte, as its list entry reads.
         {std::string("a\0b\nc\0\r\nd", 9), "a/c/d/"},
+        {many, manyLines},
     };
     ScratchDir dir;
     TextLineReader reader;  // reused across files and buffers
     for (const auto& [text, lines] : cases) {
+        SCOPED_TRACE(text.substr(0, 40));
         std::string path = dir.Write("lines.txt", text);
-        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), lines) << text;
+        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), lines);
         EXPECT_EQ(reader.OpenFile(path.c_str()), 1);
-        EXPECT_EQ(ReadLines(reader), lines) << text;
+        EXPECT_EQ(ReadLines(reader), lines);
         if (text.find('\0') == std::string::npos) {  // a buffer ends at its first NUL
-            EXPECT_EQ(Consume(BufferToStringList(text.c_str())), lines) << text;
+            EXPECT_EQ(Consume(BufferToStringList(text.c_str())), lines);
             reader.OpenBuffer(text.c_str());
-            EXPECT_EQ(ReadLines(reader), lines) << text;
+            EXPECT_EQ(ReadLines(reader), lines);
         }
     }
     reader.OpenBuffer(nullptr);
     EXPECT_EQ(ReadLines(reader) + Consume(BufferToStringList(nullptr)), "(null)");
-    // Lines of every length around the reader's block boundaries, then many
-    // short ones, doubled in one call and joined, come back whole.
-    std::string text, lines;
-    for (int i = 0; i < 300000; ++i) {
-        std::string line(text.size() < 700000 ? static_cast<size_t>(i) : 1,
-                         static_cast<char>('a' + i % 26));
-        text += line + (i % 3 ? "\n" : "\r\n");
-        lines += line + "/";
-    }
-    std::string big = dir.Write("big.txt", text);
-    reader.OpenFile(big.c_str());
-    EXPECT_EQ(ReadLines(reader), lines);
-    char** list = TextFileToStringList(big.c_str());
+    // Doubled in one call and joined, they come back whole.
+    char** list = BufferToStringList(many.c_str());
     list = AddStringList(list, list);
     const std::string joined = Owned(StringListToBuffer(list));
     DestroyStringList(list);
-    EXPECT_EQ(Consume(BufferToStringList(joined.c_str())), lines + lines);
+    EXPECT_EQ(Consume(BufferToStringList(joined.c_str())), manyLines + manyLines);
 }
 
 // Only regular files and the null device (under any name) pass; a FIFO
