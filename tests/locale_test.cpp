@@ -23,7 +23,6 @@
 #include <stdlib.h>
 #include <string.h>
 
-#include <iomanip>
 #include <sstream>
 #include <string>
 #include <utility>
@@ -35,7 +34,6 @@ namespace {
 // 0xDD is the dotted capital I of ISO-8859-9, which that locale folds to 'i'.
 std::string Ask(const ScratchDir& dir) {
     std::ostringstream out;
-    out << std::setprecision(17);
     PTNSubTree names("root");
     names.AddChild(new PTNInteger("title", 7));
     names.AddChild(new PTNInteger("item", 8));
