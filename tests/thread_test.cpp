@@ -57,16 +57,15 @@ std::string Round(int id, const std::string& file) {
     expect(doc && doc->GetValue() == id && !GetDWXCurrentFinder()->GetCurrent("nobody"),
            "registry");
 
-    DWXArray array;
-    DWXPackedArray packed;
-    DWXBag bag;
-    DWXLinkedList list;
-    for (DWXContainer* container : std::vector<DWXContainer*>{&array, &packed, &bag, &list}) {
+    std::unique_ptr<DWXContainer> containers[] = {
+        std::make_unique<DWXArray>(), std::make_unique<DWXPackedArray>(),
+        std::make_unique<DWXBag>(), std::make_unique<DWXLinkedList>()};
+    for (const auto& container : containers) {
         int sum = 0;
         for (int i = 1; i <= 10; ++i) {
             container->Add(new PTNInteger("i", i));
         }
-        DWXIter it(container);
+        DWXIter it(container.get());
         for (DWXObject* object = it.Start(); object; object = it.Next()) {
             sum += static_cast<PTNInteger*>(object)->GetValue();
         }

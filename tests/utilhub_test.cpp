@@ -233,8 +233,7 @@ TEST(UtilhubText, ExpandWhiteSpaceFormattingAndToday) {
     struct tm local;
     localtime_r(&now, &local);
     char today[32];
-    snprintf(today, sizeof today, "%d-%d-%d", local.tm_mday, local.tm_mon + 1,
-             local.tm_year + 1900);
+    strftime(today, sizeof today, "%-d-%-m-%Y", &local);  // day and month unpadded
     EXPECT_STREQ(IMPTime(nullptr, 10), today);
     EXPECT_EQ(std::string(IMPTime(nullptr, 0)).find(today + std::string(" ")), 0u);
 }
