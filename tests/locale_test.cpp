@@ -44,13 +44,11 @@ std::string Ask() {
     ExceptionList exceptions;
     exceptions.Add("TITLE");
     DWXString title("title");
-    PTNBool yes("b", 0);
-    yes.SetAsString("true");
     out << "\noptions " << options.GetInt("-TITLE", -1) << options.Exist("-i") << " "
         << options.GetFloat("-f", 0) << "\nexceptions " << exceptions.IsMember("title")
         << exceptions.IsMember("t\xDDtle") << "\nstring " << title.CompareNoCase("TITLE") << " "
         << static_cast<const char*>(title.MakeUpper()) << " " << DWXString(" 2.5e1").ToDouble()
-        << "\nbool " << Text(yes) << "\nvalidate ";
+        << "\nvalidate ";
     for (const char* name : {"ITEM", "\xDDtem"}) {
         FILE* stream = fmemopen(const_cast<char*>("(item SUBTREE\n)\n"), 16, "r");
         out << PTNSubTree::PTNValidateFile(stream, name);
