@@ -28,6 +28,13 @@ std::string Consume(char** list) {
     return list ? entries : "(null)";
 }
 
+// A heap text as a string, "(null)" for none, and the text released.
+std::string Owned(char* text) {
+    const std::string owned = text ? text : "(null)";
+    free(text);
+    return owned;
+}
+
 // The same for every line the opened reader hands out.
 std::string ReadLines(TextLineReader& reader) {
     std::string lines;
@@ -49,23 +56,17 @@ TEST(UtilhubStringList, Tokenize) {
         std::string text;
         const char* delimiters;  // null: Tokenize
         std::string tokens;
-    } cases[] = {{" \t\r\n\v\f", nullptr, ""},
-                 {"  a  b\tc\r\nd\ve\ff ", nullptr, "a/b/c/d/e/f/"},
-                 {"(t String \"Main window\")", nullptr, "(t/String/\"Main window\")/"},
-                 {"a\"b c\"d e", nullptr, "a\"b c\"d/e/"},
-                 {"\"\" \"x\ty\"", nullptr, "\"\"/\"x\ty\"/"},
-                 {"x \"never closed  y", nullptr, "x/\"never closed  y/"},
-                 {"a " + longWord, nullptr, "a/" + longWord + "/"},
-                 {",a,,b,", ",", "a/b/"},
-                 {" x | y ", "|", " x / y /"},
-                 {"-o a|b", " |", "-o/a/b/"},
-                 {",,,", ",", ""},
-                 {"whole", "", "whole/"}};
+    } cases[] = {
+        {" \t\r\n\v\f", nullptr, ""},
+        {" a  b\tc\r\nd\ve\ff " + longWord, nullptr, "a/b/c/d/e/f/" + longWord + "/"},
+        {"a\"b\tc\"d \"\" (t \"never closed  y", nullptr, "a\"b\tc\"d/\"\"/(t/\"never closed  y/"},
+        {",a,,b,", ",", "a/b/"},
+        {" x |y-z", "|-", " x /y/z/"},
+        {",,,", ",", ""}};
     for (const Case& c : cases) {
         const char* text = c.text.c_str();
-        EXPECT_EQ(Consume(c.delimiters ? TokenizeDelim(text, c.delimiters) : Tokenize(text)),
-                  c.tokens)
-            << c.text.substr(0, 40);
+        char** list = c.delimiters ? TokenizeDelim(text, c.delimiters) : Tokenize(text);
+        EXPECT_EQ(Consume(list), c.tokens) << c.text.substr(0, 40);
     }
     EXPECT_EQ(Consume(Tokenize(nullptr)) + Consume(TokenizeDelim(nullptr, ",")), "");
 }
@@ -76,19 +77,11 @@ TEST(UtilhubStringList, AppendsToCopiesAndToListsBuiltByHand) {
     EXPECT_EQ(DuplicateStringList(nullptr), nullptr);
     char** list = AddStringList(AddStringToList(AddStringToList(nullptr, "one"), nullptr), nullptr);
     char** copy = DuplicateStringList(list);
-    EXPECT_NE(copy[0], list[0]);
     list = AddStringList(list, copy);
     list = AddStringList(list, list);  // appending a list to itself doubles it
     EXPECT_EQ(Consume(copy), "one//");
     EXPECT_EQ(Consume(list), "one//one//one//one//");
 
-    char** foreign = static_cast<char**>(HCalloc(sizeof(char*), 3));  // no room to spare
-    foreign[0] = HString("a");
-    foreign[1] = HString("b");
-    foreign = AddStringToList(AddStringToList(foreign, "c"), "d");
-    free(foreign[3]);
-    foreign[3] = nullptr;
-    EXPECT_EQ(Consume(AddStringToList(foreign, "e")), "a/b/c/e/");
     char** cut = Tokenize("a b c");
     free(cut[1]);
     free(cut[2]);
@@ -96,83 +89,67 @@ TEST(UtilhubStringList, AppendsToCopiesAndToListsBuiltByHand) {
     EXPECT_EQ(Consume(AddStringToList(AddStringToList(cut, "NEW"), "NEXT")), "a/NEW/NEXT/");
     for (bool bulk : {false, true}) {
         DestroyStringList(Tokenize("0 1 2 3 4 5 6 7 8 9 10 11 12 13 14 15 16 17 18 19"));
-        char** host =
-            static_cast<char**>(malloc(32 * sizeof(char*)));  // often the block just freed
+        // Exactly full, or often the block just freed.
+        char** host = static_cast<char**>(malloc((bulk ? 32 : 2) * sizeof(char*)));
         host[0] = HString("x");
         host[1] = nullptr;
         char* more[] = {const_cast<char*>("y"), const_cast<char*>("z"), nullptr};
-        host = bulk ? AddStringList(host, more) : AddStringToList(host, "y");
-        EXPECT_EQ(Consume(host), bulk ? "x/y/z/" : "x/y/");
+        host = bulk ? AddStringList(host, more) : AddStringToList(AddStringToList(host, "y"), "z");
+        EXPECT_EQ(Consume(host), "x/y/z/");
     }
 }
 
 // Files, buffers, the list readers and the line reader split lines alike.
 TEST(UtilhubStringList, LinesOfBuffersAndFiles) {
-    const std::string l1(100000, 'L'), l3(300000, 'L');
+    // Lines of every length around the readers' block boundaries, then many short ones.
+    std::string many, manyLines;
+    for (int i = 0; i < 300000; ++i) {
+        std::string line(many.size() < 700000 ? static_cast<size_t>(i) : 1,
+                         static_cast<char>('a' + i % 26));
+        many += line + (i % 3 ? "\n" : "\r\n");
+        manyLines += line + "/";
+    }
+    const std::string l3(300000, 'L');
     const std::pair<std::string, std::string> cases[] = {
+        {"\n", "/"},  // first, so that a fresh reader's first line is empty
         {"", ""},
-        {"a", "a/"},
-        {"a\nb\n", "a/b/"},
-        {"a\r\nb\r\n", "a/b/"},
-        {"a\r\r\nb\r", "a\r/b/"},
-        {"x\n\n  \ny", "x//  /y/"},
-        {"\xEF\xBB\xBFhead\n", "head/"},  // a byte order mark only at the start
-        {"a\n\xEF\xBB\xBF", "a/\xEF\xBB\xBF/"},
-        {l1 + "\nshort", l1 + "/short/"},
-        {l3 + "\r", l3 + "/"},
+        {"a\n\n  \nb\r\r\nc\r\nd", "a//  /b\r/c/d/"},  // one CR at most goes
+        // A byte order mark counts only at the start.
+        {"\xEF\xBB\xBFhead\n\xEF\xBB\xBF", "head/\xEF\xBB\xBF/"},
+        {l3 + "\r\nshort\r", l3 + "/short/"},
         // A file line ends at its first NUL byte, as its list entry reads.
         {std::string("a\0b\nc\0\r\nd", 9), "a/c/d/"},
+        {many, manyLines},
     };
     ScratchDir dir;
     TextLineReader reader;  // reused across files and buffers
     for (const auto& [text, lines] : cases) {
+        SCOPED_TRACE(text.substr(0, 40));
         std::string path = dir.Write("lines.txt", text);
-        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), lines) << text;
+        EXPECT_EQ(Consume(TextFileToStringList(path.c_str())), lines);
         EXPECT_EQ(reader.OpenFile(path.c_str()), 1);
-        EXPECT_EQ(ReadLines(reader), lines) << text;
+        EXPECT_EQ(ReadLines(reader), lines);
         if (text.find('\0') == std::string::npos) {  // a buffer ends at its first NUL
-            EXPECT_EQ(Consume(BufferToStringList(text.c_str())), lines) << text;
+            EXPECT_EQ(Consume(BufferToStringList(text.c_str())), lines);
             reader.OpenBuffer(text.c_str());
-            EXPECT_EQ(ReadLines(reader), lines) << text;
+            EXPECT_EQ(ReadLines(reader), lines);
         }
     }
-    // Lines of every length around the reader's block boundaries, then many
-    // short ones, doubled in one call and joined, come back whole.
-    std::string text, lines;
-    for (int i = 0; i < 300000; ++i) {
-        std::string line(text.size() < 700000 ? static_cast<size_t>(i) : 1,
-                         static_cast<char>('a' + i % 26));
-        text += line + (i % 3 ? "\n" : "\r\n");
-        lines += line + "/";
-    }
-    std::string big = dir.Write("big.txt", text);
-    reader.OpenFile(big.c_str());
-    EXPECT_EQ(ReadLines(reader), lines);
-    char** list = TextFileToStringList(big.c_str());
-    list = AddStringList(list, list);
-    char* joined = StringListToBuffer(list);
-    DestroyStringList(list);
-    EXPECT_EQ(Consume(BufferToStringList(joined)), lines + lines);
-    free(joined);
-    const char* some[] = {"a", "", "b", nullptr};
-    joined = StringListToBuffer(const_cast<char**>(some));
-    EXPECT_STREQ(joined, "a\n\nb\n");
-    free(joined);
-
-    // A new reader's first line may be empty; nothing to read gives no lines.
-    TextLineReader fresh;
-    fresh.OpenBuffer("\n");
-    EXPECT_EQ(ReadLines(fresh), "/");
     reader.OpenBuffer(nullptr);
-    EXPECT_EQ(ReadLines(reader), "");
-    EXPECT_EQ(BufferToStringList(nullptr), nullptr);
+    EXPECT_EQ(ReadLines(reader) + Consume(BufferToStringList(nullptr)), "(null)");
+    // Doubled in one call and joined, they come back whole.
+    char** list = BufferToStringList(many.c_str());
+    list = AddStringList(list, list);
+    const std::string joined = Owned(StringListToBuffer(list));
+    DestroyStringList(list);
+    EXPECT_EQ(Consume(BufferToStringList(joined.c_str())), manyLines + manyLines);
 }
 
 // Only regular files and the null device (under any name) pass; a FIFO
 // without a writer is refused at once, never waited on. Streams that DKOpen
-// opened remember their path.
-TEST(UtilhubFiles, CheckingOpeningAndReading) {
-    ScratchDir dir;
+// opened remember their path. Names are looked for along the path variables.
+TEST(UtilhubFiles, CheckingFindingAndReading) {
+    ScratchDir dir, second;
     std::string file = dir.Write("read.cfg", "first\r\n\nlast");
     std::string fifo = dir.Path("pipe"), nullLink = dir.Path("off.cfg");
     ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
@@ -183,20 +160,36 @@ TEST(UtilhubFiles, CheckingOpeningAndReading) {
     }
     FILE* stream = DKOpen(file.c_str(), 4, "r");
     ASSERT_NE(stream, nullptr);
-    const char* name = fp2filename(stream);
-    EXPECT_EQ(name, file);
-    EXPECT_EQ(fp2filename(stream), name);
+    EXPECT_EQ(fp2filename(stream), file);
     for (const char* line : {"first", "", "last"}) {
         EXPECT_STREQ(DKReadLine(stream), line);
     }
     EXPECT_EQ(DKReadLine(stream), nullptr);
-    EXPECT_EQ(DKClose(stream), 0);
-    EXPECT_EQ(DKClose(nullptr), 0);
+    EXPECT_EQ(DKClose(stream) + DKClose(nullptr), 0);
     // Streams DKOpen did not open, possibly at the address of a closed one, have no path.
     FILE* foreign = fopen(file.c_str(), "r");
     EXPECT_EQ(fp2filename(foreign), nullptr);
-    EXPECT_EQ(fp2filename(nullptr), nullptr);
     fclose(foreign);
+
+    second.Write("both.cfg", "");
+    second.Write("late.cfg", "");
+    setenv(DWX_ETC_PATH_VARIABLE, ("/none::" + dir.Root() + ":" + second.Root() + "/").c_str(), 1);
+    setenv(DWX_PRO_PATH_VARIABLE, second.Root().c_str(), 1);
+    ASSERT_EQ(mkdir(dir.Path("late.cfg").c_str(), 0700), 0);  // a directory is no match
+    dir.Write("both.cfg", "");
+    EXPECT_EQ(Owned(IMPFindFile("etc", "both.cfg")), dir.Path("both.cfg"));
+    EXPECT_EQ(Owned(IMPFindFile("etc", "late.cfg")), second.Path("late.cfg"));
+    EXPECT_EQ(Owned(IMPFindFile("pro", "both.cfg")), second.Path("both.cfg"));
+    EXPECT_EQ(Owned(IMPFindFile("etc", "absent.cfg")) + Owned(IMPFindFile("bin", "both.cfg")),
+              "(null)(null)");
+    unsetenv(DWX_PRO_PATH_VARIABLE);
+    EXPECT_EQ(Owned(IMPFindFile("pro", "both.cfg")) + Owned(IMPFindFile(nullptr, "both.cfg")),
+              "(null)(null)");
+    unsetenv(DWX_ETC_PATH_VARIABLE);
+    // A relative name is looked for next to the including file, an absolute one never.
+    EXPECT_EQ(Owned(IMPFindFileNextTo(second.Path("x.cfg").c_str(), "late.cfg")),
+              second.Path("late.cfg"));
+    EXPECT_EQ(IMPFindFileNextTo("/z/x.cfg", second.Path("both.cfg").c_str()), nullptr);
 
     EXPECT_EQ(DKOpen(dir.Path("missing").c_str(), 4, "r"), nullptr);
     chmod(file.c_str(), 0);  // unreadable, unless we are root
@@ -211,85 +204,42 @@ TEST(UtilhubFiles, CheckingOpeningAndReading) {
         EXPECT_EQ(reader.OpenFile(path.c_str()), 0) << path;
         EXPECT_EQ(reader.Next(nullptr), nullptr) << path;
     }
-    EXPECT_EQ(DKCheck(nullptr), 0);
-    EXPECT_EQ(TextFileToStringList(nullptr), nullptr);
+    EXPECT_EQ(std::to_string(DKCheck(nullptr)) + Consume(TextFileToStringList(nullptr)), "0(null)");
 }
 
-TEST(UtilhubFiles, FindingAndExpandingPaths) {
-    ScratchDir first, second;
-    second.Write("both.cfg", "");
-    first.Write("both.cfg", "");
-    second.Write("late.cfg", "");
-    ASSERT_EQ(mkdir(first.Path("late.cfg").c_str(), 0700), 0);  // a directory is no match
-    setenv(DWX_ETC_PATH_VARIABLE, ("/none::" + first.Root() + ":" + second.Root() + "/").c_str(),
-           1);
-    setenv(DWX_PRO_PATH_VARIABLE, second.Root().c_str(), 1);
+TEST(UtilhubText, ExpandWhiteSpaceFormattingAndToday) {
     setenv("UTILHUB_DIR", "/opt/conf", 1);
     unsetenv("UTILHUB_UNSET");
-    struct Case {
-        const char* key;  // null: expand `text`
-        const char* text;
-        std::string expected;  // empty: not found
-    } cases[] = {{"etc", "both.cfg", first.Path("both.cfg")},
-                 {"etc", "late.cfg", second.Path("late.cfg")},
-                 {"pro", "both.cfg", second.Path("both.cfg")},
-                 {"etc", "absent.cfg", ""},
-                 {"bin", "both.cfg", ""},
-                 {"etc", "", ""},
-                 {nullptr, "$UTILHUB_DIR/a.cfg", "/opt/conf/a.cfg"},
-                 {nullptr, "${UTILHUB_DIR}x[$UTILHUB_UNSET]${UTILHUB_UNSET}", "/opt/confx[]"},
-                 {nullptr, "cost $5 and $ and a$", "cost $5 and $ and a$"},
-                 {nullptr, "${} ${UTILHUB_DIR", "${} ${UTILHUB_DIR"},
-                 {nullptr, "$$UTILHUB_DIR", "$/opt/conf"}};
-    for (const Case& c : cases) {
-        char* found = c.key ? IMPFindFile(c.key, c.text) : HStringExpand(c.text);
-        EXPECT_EQ(found ? std::string(found) : std::string(), c.expected) << c.text;
-        free(found);
-    }
-    unsetenv(DWX_PRO_PATH_VARIABLE);
-    EXPECT_EQ(IMPFindFile("pro", "both.cfg"), nullptr);
-    EXPECT_EQ(IMPFindFile(nullptr, "both.cfg"), nullptr);
-    // A relative name is looked for next to the including file, an absolute one never.
-    char* next = IMPFindFileNextTo(second.Path("x.cfg").c_str(), "late.cfg");
-    EXPECT_EQ(next, second.Path("late.cfg"));
-    free(next);
-    EXPECT_EQ(IMPFindFileNextTo("/z/x.cfg", first.Path("both.cfg").c_str()), nullptr);
+    EXPECT_EQ(Owned(HStringExpand("${UTILHUB_DIR}x[$UTILHUB_UNSET]$UTILHUB_DIR/a")),
+              "/opt/confx[]/opt/conf/a");
+    // What is no variable keeps its '$'.
+    EXPECT_EQ(Owned(HStringExpand("$$UTILHUB_DIR $ ${} $5 a$ ${UTILHUB_DIR")),
+              "$/opt/conf $ ${} $5 a$ ${UTILHUB_DIR");
     EXPECT_EQ(HStringExpand(nullptr), nullptr);
-    unsetenv(DWX_ETC_PATH_VARIABLE);
-}
 
-TEST(UtilhubText, WhiteSpaceFormattingAndToday) {
     char trailing[] = " \v\f a b \t\r\n";
     EXPECT_EQ(LSCGetFirstNonWhiteSpace(trailing), trailing + 4);
     EXPECT_STREQ(LSCEatWSBack(trailing), " \v\f a b");
-    EXPECT_EQ(LSCEatWSBack(nullptr), nullptr);
-    const std::string::size_type npos = std::string::npos;
     std::string words = "  ab c \n", blank = " \t ";
     EXPECT_EQ(FindFirstNonWhitespace(words, 4), 5u);
-    EXPECT_EQ(FindFirstNonWhitespace(words, 6), npos);
     EXPECT_EQ(FindLastNonWhitespace(words), 5u);
-    EXPECT_EQ(FindLastNonWhitespace(words, 1), npos);
-    EXPECT_EQ(FindLastNonWhitespace(std::string()), npos);
+    EXPECT_EQ(FindFirstNonWhitespace(words, 6), std::string::npos);
+    EXPECT_EQ(FindLastNonWhitespace(words, 1), std::string::npos);
     EXPECT_EQ(TrimWhitespace(words) + TrimWhitespace(blank), "ab c");
-    std::string big(50000, 'z');
-    char* formatted = HSPrintf("<%s|%d>", big.c_str(), 7);
-    EXPECT_EQ(formatted, "<" + big + "|7>");
-    free(formatted);
+    const std::string big(50000, 'z');  // longer than any fixed buffer
+    EXPECT_EQ(Owned(HSPrintf("<%s|%d>", big.c_str(), 7)), "<" + big + "|7>");
 
-    time_t now = time(nullptr);
+    const time_t now = time(nullptr);
     struct tm local;
     localtime_r(&now, &local);
-    const std::string today = std::to_string(local.tm_mday) + "-" +
-                              std::to_string(local.tm_mon + 1) + "-" +
-                              std::to_string(local.tm_year + 1900);
-    EXPECT_EQ(IMPTime(nullptr, 10), today);
-    EXPECT_EQ(std::string(IMPTime(nullptr, 0)).substr(0, today.size() + 1), today + " ");
+    char today[32];
+    strftime(today, sizeof today, "%-d-%-m-%Y", &local);  // day and month unpadded
+    EXPECT_STREQ(IMPTime(nullptr, 10), today);
+    EXPECT_EQ(std::string(IMPTime(nullptr, 0)).find(today + std::string(" ")), 0u);
 }
 
 TEST(UtilhubReport, HandlerSeesEveryReportAndSeverityOneThrows) {
     ReportCapture capture;
-    EXPECT_NE(capture.Previous(), nullptr);  // the default handler
-    IMPError(100, 0, "bad date");
     IMPError(3, 2, nullptr);
     try {
         IMPError(-1, 1, "Corrupt file x\n at line 5");
@@ -299,39 +249,26 @@ TEST(UtilhubReport, HandlerSeesEveryReportAndSeverityOneThrows) {
         EXPECT_STREQ(e.what(), "Corrupt file x\n at line 5");
     }
     // The handler saw the last report before the throw.
-    EXPECT_EQ(capture.Texts(), (std::vector<std::string>{"100/0 bad date", "3/2 ",
-                                                         "-1/1 Corrupt file x\n at line 5"}));
-    // The default handler writes one line.
-    EXPECT_EQ(IMPSetErrorHandler(nullptr), ReportCapture::Handler());
-    testing::internal::CaptureStderr();
-    IMPError(7, 2, "first\nsecond\n");
-    std::string written = testing::internal::GetCapturedStderr();
-    EXPECT_EQ(written.find('\n'), written.size() - 1) << written;
-    EXPECT_NE(written.find('7'), std::string::npos) << written;
-    EXPECT_NE(written.find("first second"), std::string::npos) << written;
-}
-
-void Note(char c) {
-    fprintf(stderr, "@%c", c);
+    EXPECT_EQ(capture.Texts(),
+              (std::vector<std::string>{"3/2 ", "-1/1 Corrupt file x\n at line 5"}));
 }
 
 // Callbacks run once each, last registered first, those registered while
 // they run included; one that throws stops none of the others.
 TEST(UtilhubAtExitDeathTest, CallbacksRunOnceLastRegisteredFirst) {
     auto child = [] {
-        _IMPAtExit([] { Note('a'); }, __FILE__, __LINE__);
+        _IMPAtExit([] { fputs("@a", stderr); }, __FILE__, __LINE__);
         _IMPAtExit([] { throw 1; }, __FILE__, __LINE__);
-        _IMPAtExit([] { Note('b'); }, __FILE__, __LINE__);
         _IMPAtExit(
             [] {
-                Note('c');
-                _IMPAtExit([] { Note('d'); }, __FILE__, __LINE__);  // while they run
+                fputs("@c", stderr);
+                _IMPAtExit([] { fputs("@d", stderr); }, __FILE__, __LINE__);  // while they run
             },
             __FILE__, __LINE__);
         _IMPAtExit(nullptr, __FILE__, __LINE__);
         exit(0);
     };
-    EXPECT_EXIT(child(), testing::ExitedWithCode(0), "^@c@d@b[^@]*@a$");
+    EXPECT_EXIT(child(), testing::ExitedWithCode(0), "^@c@d[^@]*@a$");
 }
 
 }  // namespace
