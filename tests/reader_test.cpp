@@ -71,9 +71,8 @@ TEST_F(ReaderTest, EveryKeywordBuildsItsNode) {
     }
     auto tree = Read(
         "(i Integer -2147483648 )\n(j INTEGER 12abc\n(k iNtEgEr 7)\n(c Char xyz)\n"
-        "(d Double -2.5e3)\n(b1 Boolean yes)\n(b2 bool Y)\n(b3 BOOLish 1)\n(b4 Bool TRUE)\n(f1 "
-        "Bool on)\n"
-        "(f2 Bool yess)\n(f4 Bool \x11)\n(f5 Bool\xC0 t)\n"
+        "(d Double -2.5e3)\n(b1 Boolean yes)\n(b2 bool Y)\n(b3 BOOLish 1)\n(b4 Bool TRUE)\n"
+        "(f1 Bool on)\n(f2 Bool yess)\n(f4 Bool \x11)\n(f5 Bool\xC0 t)\n"
         "(s1 String \"Main window\")\n(s2 String \"a\" \"b\")\n(s3 String a\\qb)\n(s4 String )\n"
         "(s5 String \"x\" ) ignored\n(l1 StringList \"x\" \"y z\")\n(l2 stringLIST a)\n"
         "(l3 StringList )\n(dl1 DoubleList 1.5 2.5)\n(dl2 DoubleList )\n(b64 BASE64 YWI)\n"
