@@ -232,9 +232,12 @@ void RunContainer(Source& in, int steps) {
             copy.Remove(o);
             assigned.Empty();
         } else if (op == 4) {
+            // Adding a container to itself doubles it: past 512 members the
+            // step adds null instead, so that runs stay small.
             const Members walk = Walk(c);
             DWXBag other(&c);
-            const int source = in.Range(0, 2);
+            const int drawn = in.Range(0, 2);
+            const int source = items.size() > 512 ? 2 : drawn;
             const DWXContainer* added[] = {&c, &other, nullptr};
             c.AddContainer(added[source]);
             items.insert(items.end(), walk.begin(), source < 2 ? walk.end() : walk.begin());
