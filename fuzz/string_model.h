@@ -90,8 +90,9 @@ struct StringModel {
                 s = static_cast<const DWXString&>(s);
                 const char* own = s;
                 const std::string tail(model.c_str() + start);
-                ch & 1 ? (s += own + start) : (s = own + start);
-                ch & 1 ? (model += tail) : (model = tail);
+                const bool append = (ch & 1) && !big;  // appending from 0 doubles
+                append ? (s += own + start) : (s = own + start);
+                append ? (model += tail) : (model = tail);
                 break;
             }
             case 6:
