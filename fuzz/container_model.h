@@ -6,6 +6,8 @@
 
 #include <dwxcore/dwxobject.h>
 
+#include "captured.h"
+
 #include <stdio.h>
 #include <stdlib.h>
 
@@ -67,19 +69,6 @@ inline Members Walk(const DWXContainer& container) {
         members.push_back(o);
     }
     return members;
-}
-
-// What `write` writes to a stream, read back through open_memstream.
-template <typename Writer>
-std::string Captured(Writer write) {
-    char* buffer = nullptr;
-    size_t length = 0;
-    FILE* stream = open_memstream(&buffer, &length);
-    write(stream);
-    fclose(stream);
-    std::string text(buffer, length);
-    free(buffer);
-    return text;
 }
 
 inline Members WithoutNulls(Members items) {

@@ -2,13 +2,11 @@
 // and containers filled in one call.
 #pragma once
 
-#include "../fuzz/container_model.h"
+#include "../fuzz/captured.h"
 
 #include <dwxcore/dwxobject.h>
 
 #include <initializer_list>
-
-using container_model::Captured;  // what a writer callback writes to a stream
 
 inline void AddAll(DWXContainer& container, std::initializer_list<DWXObject*> members) {
     for (DWXObject* member : members) {
